@@ -40,8 +40,8 @@ public:
     public:
         /** A rule without an IMSI that blocks. */
         Rule();
-        /** A rule for the SIM @p imsi; see isValidImsi() for what the filters accept. */
-        Rule(const QString &imsi, Action action);
+        /** A rule for the SIM @p simImsi; see isValidImsi() for what the filters accept. */
+        Rule(const QString &simImsi, Action simAction);
 
         /** Whether IMSI and action are the same. */
         bool operator==(const Rule &other) const;

@@ -40,8 +40,8 @@ class CORVANEMDM_EXPORT SimVoiceCallFilter : public QObject
     Q_PROPERTY(Corvane::Mdm::SimFilter::Action defaultIncomingAction READ defaultIncomingAction WRITE
                    setDefaultIncomingAction NOTIFY defaultIncomingActionChanged)
     /** Rules for outgoing calls, in the service's order. */
-    Q_PROPERTY(Corvane::Mdm::SimFilter::RuleList dialRules READ dialRules WRITE setDialRules NOTIFY
-                   dialRulesChanged)
+    Q_PROPERTY(
+        Corvane::Mdm::SimFilter::RuleList dialRules READ dialRules WRITE setDialRules NOTIFY dialRulesChanged)
     /** Rules for incoming calls, in the service's order. */
     Q_PROPERTY(Corvane::Mdm::SimFilter::RuleList incomingRules READ incomingRules WRITE setIncomingRules
                    NOTIFY incomingRulesChanged)

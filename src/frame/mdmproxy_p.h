@@ -1,0 +1,41 @@
+// SPDX-License-Identifier: LGPL-2.1-or-later
+#ifndef CORVANEMDM_MDMPROXY_P_H
+#define CORVANEMDM_MDMPROXY_P_H
+
+#include <QtCore/QLatin1String>
+
+namespace Corvane
+{
+namespace Mdm
+{
+
+/** The privileged service that serves one object and one interface per feature on the system bus. */
+namespace MdmProxy
+{
+
+struct Endpoint {
+    QLatin1String path;
+    QLatin1String interface;
+};
+
+constexpr QLatin1String Service("org.corvaneos.mdmproxy");
+
+constexpr Endpoint Accounts
+    = {QLatin1String("/Corvane/Mdm/Proxy/Accounts"), QLatin1String("org.corvaneos.mdmproxy.accounts")};
+constexpr Endpoint CallStatistics = {QLatin1String("/Corvane/Mdm/Proxy/CallStatistics"),
+                                     QLatin1String("org.corvaneos.mdmproxy.callstatistics")};
+constexpr Endpoint LocationInfo = {QLatin1String("/Corvane/Mdm/Proxy/LocationInfo"),
+                                   QLatin1String("org.corvaneos.mdmproxy.locationinfo")};
+constexpr Endpoint NotificationInfo = {QLatin1String("/Corvane/Mdm/Proxy/NotificationInfo"),
+                                       QLatin1String("org.corvaneos.mdmproxy.notificationinfo")};
+constexpr Endpoint SoftwareUpdate = {QLatin1String("/Corvane/Mdm/Proxy/SoftwareUpdate"),
+                                     QLatin1String("org.corvaneos.mdmproxy.softwareupdate")};
+constexpr Endpoint Autostart
+    = {QLatin1String("/Corvane/Mdm/Proxy/Autostart"), QLatin1String("org.corvaneos.mdmproxy.autostart")};
+
+} // namespace MdmProxy
+
+} // namespace Mdm
+} // namespace Corvane
+
+#endif // CORVANEMDM_MDMPROXY_P_H
