@@ -545,7 +545,9 @@ int main(int argc, char *argv[])
     setting->add_option("--message", fault.message, "error: its text");
     setting->add_option("--delay", fault.delay, "late: milliseconds");
     setting->add_option("--arguments", fault.arguments, "reply: the values to answer with")
-        ->type_name("GVARIANT");
+        ->type_name("GVARIANT")
+        ->expected(0, 1000)
+        ->allow_extra_args(false);
     setting->add_option("--times", fault.times, "how many calls to spoil; all unless given");
     add("faults", "list the faults that are set", showFaults);
     add("clear-fault", "take a fault back",
@@ -561,7 +563,10 @@ int main(int argc, char *argv[])
     emitting->add_option("PATH", path, "object that emits it")->required();
     emitting->add_option("INTERFACE", interface, "interface of the signal")->required();
     emitting->add_option("MEMBER", member, "name of the signal")->required();
-    emitting->add_option("VALUE", words, "its arguments")->type_name("GVARIANT");
+    emitting->add_option("VALUE", words, "its arguments")
+        ->type_name("GVARIANT")
+        ->expected(0, 1000)
+        ->allow_extra_args(false);
 
     CLI::App *reading = add("journal", "print the calls that the services received",
                             [&](Phone &phone) { showJournal(phone, journal); });
@@ -578,6 +583,8 @@ int main(int argc, char *argv[])
 
     add("act", "do something to the phone", [&](Phone &phone) { act(phone, words); })
         ->add_option("ACTION", words, "words of an action and its arguments; see \"actions\"")
+        ->expected(1, 1000)
+        ->allow_extra_args(false)
         ->required();
     add("actions", "list what can be done to the phone", showActions);
 
