@@ -1,6 +1,8 @@
 // SPDX-License-Identifier: LGPL-2.1-or-later
 #include "rulechannel_p.h"
 
+#include "frame/latin1_p.h"
+
 #include <QtCore/QPointer>
 #include <QtDBus/QDBusConnection>
 #include <QtDBus/QDBusPendingReply>
@@ -15,7 +17,7 @@ namespace Mdm
 namespace
 {
 
-constexpr QLatin1String OfonoService("org.ofono");
+constexpr QLatin1String OfonoService = "org.ofono"_L1;
 
 auto hasImsi(const QString &imsi)
 {
