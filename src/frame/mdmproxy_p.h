@@ -2,7 +2,7 @@
 #ifndef CORVANEMDM_MDMPROXY_P_H
 #define CORVANEMDM_MDMPROXY_P_H
 
-#include "frame/latin1_p.h"
+#include <QtCore/QLatin1String>
 
 namespace Corvane
 {
@@ -18,18 +18,21 @@ struct Endpoint {
     QLatin1String interface;
 };
 
-constexpr QLatin1String Service = "org.corvaneos.mdmproxy"_L1;
+// Not constexpr: QLatin1String counts its characters with strlen, which Clang does not take for a constant.
+const QLatin1String Service("org.corvaneos.mdmproxy");
 
-constexpr Endpoint Accounts = {"/Corvane/Mdm/Proxy/Accounts"_L1, "org.corvaneos.mdmproxy.accounts"_L1};
-constexpr Endpoint CallStatistics
-    = {"/Corvane/Mdm/Proxy/CallStatistics"_L1, "org.corvaneos.mdmproxy.callstatistics"_L1};
-constexpr Endpoint LocationInfo
-    = {"/Corvane/Mdm/Proxy/LocationInfo"_L1, "org.corvaneos.mdmproxy.locationinfo"_L1};
-constexpr Endpoint NotificationInfo
-    = {"/Corvane/Mdm/Proxy/NotificationInfo"_L1, "org.corvaneos.mdmproxy.notificationinfo"_L1};
-constexpr Endpoint SoftwareUpdate
-    = {"/Corvane/Mdm/Proxy/SoftwareUpdate"_L1, "org.corvaneos.mdmproxy.softwareupdate"_L1};
-constexpr Endpoint Autostart = {"/Corvane/Mdm/Proxy/Autostart"_L1, "org.corvaneos.mdmproxy.autostart"_L1};
+const Endpoint Accounts
+    = {QLatin1String("/Corvane/Mdm/Proxy/Accounts"), QLatin1String("org.corvaneos.mdmproxy.accounts")};
+const Endpoint CallStatistics = {QLatin1String("/Corvane/Mdm/Proxy/CallStatistics"),
+                                 QLatin1String("org.corvaneos.mdmproxy.callstatistics")};
+const Endpoint LocationInfo = {QLatin1String("/Corvane/Mdm/Proxy/LocationInfo"),
+                               QLatin1String("org.corvaneos.mdmproxy.locationinfo")};
+const Endpoint NotificationInfo = {QLatin1String("/Corvane/Mdm/Proxy/NotificationInfo"),
+                                   QLatin1String("org.corvaneos.mdmproxy.notificationinfo")};
+const Endpoint SoftwareUpdate = {QLatin1String("/Corvane/Mdm/Proxy/SoftwareUpdate"),
+                                 QLatin1String("org.corvaneos.mdmproxy.softwareupdate")};
+const Endpoint Autostart
+    = {QLatin1String("/Corvane/Mdm/Proxy/Autostart"), QLatin1String("org.corvaneos.mdmproxy.autostart")};
 
 } // namespace MdmProxy
 

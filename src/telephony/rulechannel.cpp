@@ -1,8 +1,6 @@
 // SPDX-License-Identifier: LGPL-2.1-or-later
 #include "rulechannel_p.h"
 
-#include "frame/latin1_p.h"
-
 #include <QtCore/QPointer>
 #include <QtDBus/QDBusConnection>
 #include <QtDBus/QDBusPendingReply>
@@ -17,7 +15,7 @@ namespace Mdm
 namespace
 {
 
-constexpr QLatin1String OfonoService = "org.ofono"_L1;
+const QLatin1String OfonoService("org.ofono");
 
 auto hasImsi(const QString &imsi)
 {

@@ -1,7 +1,6 @@
 // SPDX-License-Identifier: LGPL-2.1-or-later
 #include <corvanemdm/simvoicecallfilter.h>
 
-#include "frame/latin1_p.h"
 #include "simvoicecallfilter_p.h"
 
 namespace Corvane
@@ -12,7 +11,7 @@ namespace Mdm
 namespace
 {
 
-constexpr QLatin1String Interface = "org.corvaneos.ofono.mdm.VoiceCallFilter"_L1;
+const QLatin1String Interface("org.corvaneos.ofono.mdm.VoiceCallFilter");
 
 } // namespace
 
