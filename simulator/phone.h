@@ -1,0 +1,45 @@
+// SPDX-License-Identifier: LGPL-2.1-or-later
+#ifndef CORVANE_SIMULATOR_PHONE_H
+#define CORVANE_SIMULATOR_PHONE_H
+
+#include <QtCore/QJsonObject>
+#include <QtCore/QString>
+#include <QtCore/QStringList>
+
+#include <optional>
+#include <vector>
+
+namespace Corvane
+{
+namespace Simulator
+{
+
+/** A SIM card, in its slot or, when not present, beside it. */
+struct Sim {
+    QString imsi;
+    QString iccid;
+    QString provider;
+    QStringList numbers;
+    bool present = false;
+};
+
+/** What several services know of the phone. */
+class Phone
+{
+public:
+    /** @p profile is complete and has been checked. */
+    explicit Phone(const QJsonObject &profile);
+
+    /** The card that comes with @p imsi when nothing more is known of it. */
+    static Sim cardWithImsi(const QString &imsi);
+
+    /** The slot that @p text is the number of; empty when there is no such slot. */
+    std::optional<std::size_t> slotNumbered(const QString &text) const;
+
+    std::vector<Sim> sims; ///< by slot
+};
+
+} // namespace Simulator
+} // namespace Corvane
+
+#endif // CORVANE_SIMULATOR_PHONE_H

@@ -1,0 +1,87 @@
+// SPDX-License-Identifier: LGPL-2.1-or-later
+#include "service.h"
+
+#include "traffic.h"
+
+namespace Corvane
+{
+namespace Simulator
+{
+
+Service::Service(const QString &name, Journal &journal, FaultTable &faults)
+    : m_name(name)
+    , m_journal(journal)
+    , m_faults(faults)
+{
+}
+
+Service::~Service()
+{
+    disconnect();
+}
+
+void Service::addComponent(std::unique_ptr<Component> component)
+{
+    m_components.push_back(std::move(component));
+}
+
+void Service::start()
+{
+    m_connection = std::make_unique<BusConnection>();
+    Traffic::watch(m_connection->get(), m_name, m_journal, m_faults);
+    m_connection->watchNames([this](const QString &name, const QString &newOwner) {
+        if (!name.startsWith(QLatin1Char(':')) || !newOwner.isEmpty())
+            return;
+        for (const auto &handler : m_clientHandlers)
+            handler(name);
+    });
+    for (const std::unique_ptr<Component> &component : m_components)
+        component->attach(*this);
+    // The name comes last: who sees it finds all objects.
+    m_connection->ownName(m_name);
+}
+
+void Service::stop()
+{
+    if (!isRunning())
+        return;
+    m_connection->releaseName(m_name);
+    disconnect();
+}
+
+void Service::disconnect()
+{
+    if (!isRunning())
+        return;
+    for (const std::unique_ptr<Component> &component : m_components)
+        component->detach();
+    m_clientHandlers.clear();
+    m_connection.reset();
+}
+
+void Service::addObject(const QString &path, const QString &interface, MethodHandlers handlers)
+{
+    m_connection->addObject(path, interface, std::move(handlers));
+}
+
+void Service::removeObject(const QString &path, const QString &interface)
+{
+    m_connection->removeObject(path, interface);
+}
+
+void Service::watchClients(std::function<void(const QString &)> handler)
+{
+    m_clientHandlers.push_back(std::move(handler));
+}
+
+void Service::emitSignal(const QString &path, const QString &interface, const QString &member,
+                         GVariant *arguments, const QString &destination) const
+{
+    // Owned here: a service that is stopped would leave a floating value behind.
+    const Variant values(arguments);
+    if (isRunning())
+        m_connection->emitSignal(path, interface, member, values.get(), destination);
+}
+
+} // namespace Simulator
+} // namespace Corvane
