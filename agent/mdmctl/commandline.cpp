@@ -29,14 +29,6 @@ struct Found {
     QString error;
 };
 
-bool asksForHelp(const QStringList &words)
-{
-    return std::any_of(words.cbegin(), words.cend(), [](const QString &word) {
-        return word == QLatin1String("--help") || word == QLatin1String("-h")
-            || word == QLatin1String("--version");
-    });
-}
-
 QStringList namesOf(const QVector<Command> &commands)
 {
     QStringList names;
@@ -53,36 +45,43 @@ QString pathText(const QVector<const Command *> &path)
     return names.join(QLatin1Char(' '));
 }
 
+bool isOption(const QString &word)
+{
+    return word.startsWith(QLatin1Char('-'));
+}
+
 // CLI11 tells of a wrong command only that it did not expect it, so commands are looked up here.
 Found find(const Command &program, const QStringList &words)
 {
-    Found found{{&program}, words, {}};
-    bool json = false;
-    int i = 0;
-    for (; i < words.size() && !found.path.last()->commands.isEmpty(); ++i) {
-        const QString &word = words.at(i);
-        if (word.startsWith(QLatin1Char('-'))) {
-            json = json || word == jsonName;
+    Found found{{&program}, {}, {}};
+    QStringList early;
+    auto word = words.cbegin();
+    for (; word != words.cend() && !found.path.last()->commands.isEmpty(); ++word) {
+        if (isOption(*word)) {
+            early.append(*word);
             continue;
         }
         const QVector<Command> &commands = found.path.last()->commands;
         const auto command = std::find_if(commands.cbegin(), commands.cend(),
-                                          [&](const Command &each) { return each.name == word; });
+                                          [&](const Command &each) { return each.name == *word; });
         if (command == commands.cend()) {
-            found.error
-                = QStringLiteral("unknown command \"%1\": %2").arg(word, suggestion(word, namesOf(commands)));
+            found.error = QStringLiteral("unknown command \"%1\": %2")
+                              .arg(*word, suggestion(*word, namesOf(commands)));
             return found;
         }
         found.path.append(&*command);
+        found.words.append(*word);
     }
+    const bool json = early.removeAll(jsonName) > 0;
     const QVector<Command> &further = found.path.last()->commands;
-    if (!further.isEmpty() && !asksForHelp(words)) {
+    if (!further.isEmpty() && early.isEmpty()) {
         found.error = QStringLiteral("\"%1\" needs a command: %2")
                           .arg(pathText(found.path), suggestion(QString(), namesOf(further)));
-    } else if (json && further.isEmpty()) {
-        found.words.removeOne(jsonName);
-        found.words.insert(i - 1, jsonName);
     }
+    found.words = early + found.words;
+    if (json)
+        found.words.append(jsonName);
+    found.words.append(words.mid(int(word - words.cbegin())));
     return found;
 }
 
@@ -93,7 +92,6 @@ public:
     {
         column_width(26);
         label("Positionals", "Arguments");
-        label("Subcommands", "Commands");
         label("SUBCOMMAND", "COMMAND");
     }
 
@@ -120,7 +118,8 @@ public:
         : m_app(program.summary.toStdString(), program.name.toStdString())
     {
         m_app.formatter(std::make_shared<HelpFormatter>());
-        m_app.set_version_flag("--version", program.name.toStdString() + " " MDMCTL_VERSION);
+        m_app.set_version_flag("--version", program.name.toStdString() + " " MDMCTL_VERSION,
+                               "Show the version and exit");
         describe(&m_app, program, program.name);
     }
 
@@ -143,6 +142,7 @@ private:
     void addOption(CLI::App *app, const Command &command, const Option &option);
     QString explain(const CLI::ParseError &error) const;
     QString explainExtra() const;
+    QString usage() const;
     const CLI::App *parsedApp() const;
 
     CLI::App m_app;
@@ -151,6 +151,7 @@ private:
 
 void Parser::describe(CLI::App *app, const Command &command, const QString &path)
 {
+    app->group("Commands");
     app->set_help_flag("-h,--help", "Show this help and exit");
     QString footer = command.description;
     if (command.run) {
@@ -183,6 +184,7 @@ void Parser::addArgument(CLI::App *app, const Command &command, const Argument &
     CLI::Option *option = app->add_option(argument.name.toStdString(), values, argument.help.toStdString());
     option->required(argument.count != Argument::Optional);
     option->expected(1, argument.count == Argument::Several ? -1 : 1);
+    option->allow_extra_args(argument.count == Argument::Several);
     m_inputs.back().option = option;
 }
 
@@ -227,8 +229,8 @@ QString Parser::explainExtra() const
 {
     const std::vector<std::string> extras = m_app.remaining(true);
     const QString extra = extras.empty() ? QString() : QString::fromStdString(extras.front());
-    if (!extra.startsWith(QLatin1Char('-')))
-        return QStringLiteral("unexpected argument \"%1\"").arg(extra);
+    if (!isOption(extra))
+        return QStringLiteral("unexpected argument \"%1\"; usage: %2").arg(extra, usage());
     QStringList names;
     for (const CLI::Option *option : parsedApp()->get_options()) {
         if (option->nonpositional())
@@ -239,27 +241,32 @@ QString Parser::explainExtra() const
 
 QString Parser::explain(const CLI::ParseError &error) const
 {
-    QString reason = QString::fromUtf8(error.what());
     if (dynamic_cast<const CLI::ExtrasError *>(&error))
-        reason = explainExtra();
-    else if (dynamic_cast<const CLI::RequiredError *>(&error))
+        return explainExtra();
+    QString reason = QString::fromUtf8(error.what());
+    if (dynamic_cast<const CLI::RequiredError *>(&error))
         reason.replace(QLatin1String(" is required"), QLatin1String(" is missing"));
     else if (dynamic_cast<const CLI::ArgumentMismatch *>(&error))
         reason = reason.section(QLatin1Char(':'), 0, 0) + QLatin1String(" needs a value");
 
+    return QStringLiteral("%1; usage: %2").arg(reason, usage());
+}
+
+QString Parser::usage() const
+{
     const CLI::App *app = parsedApp();
-    QStringList usage;
+    QStringList words;
     for (const CLI::App *each = app; each; each = each->get_parent())
-        usage.prepend(QString::fromStdString(each->get_name()));
+        words.prepend(QString::fromStdString(each->get_name()));
     for (const CLI::Option *option : app->get_options()) {
         if (!option->get_positional())
             continue;
         QString name = QString::fromStdString(option->get_name(true));
         if (option->get_expected_max() > 1)
             name += QLatin1String("...");
-        usage.append(option->get_required() ? name : QStringLiteral("[%1]").arg(name));
+        words.append(option->get_required() ? name : QStringLiteral("[%1]").arg(name));
     }
-    return QStringLiteral("%1; usage: %2").arg(reason, usage.join(QLatin1Char(' ')));
+    return words.join(QLatin1Char(' '));
 }
 
 Values Parser::valuesFor(const Command &command) const

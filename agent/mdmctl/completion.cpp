@@ -87,7 +87,10 @@ QString bashCompletion(const Command &program)
             if (!option.valueName.isEmpty() && !valued.contains(option.name))
                 valued.append(option.name);
         }
-        options += branch(path, (names << QStringLiteral("--help")).join(QLatin1Char(' ')));
+        names.append(QStringLiteral("--help"));
+        if (&command == &program)
+            names.append(QStringLiteral("--version"));
+        options += branch(path, names.join(QLatin1Char(' ')));
         QStringList further;
         for (const Command &each : command.commands)
             further.append(each.name);

@@ -42,8 +42,8 @@ Command program()
 int main(int argc, char *argv[])
 {
     WarningCapture::install("mdmctl: ");
-    const Interruption interruption;
     const QCoreApplication application(argc, argv);
+    const Interruption interruption;
     const int status = runCommandLine(program(), QCoreApplication::arguments().mid(1));
     if (flushOutput())
         return status;

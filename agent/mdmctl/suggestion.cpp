@@ -2,7 +2,6 @@
 #include "suggestion.h"
 
 #include <algorithm>
-#include <limits>
 #include <numeric>
 #include <vector>
 
@@ -37,6 +36,23 @@ int distance(const QString &a, const QString &b)
     return previous.back();
 }
 
+// The choice that a slip or a cut-off word stands for; empty when none is near.
+QString nearest(const QString &given, const QStringList &choices)
+{
+    QString found;
+    int tolerated = std::min(std::max(1, given.size() / 3), given.size() - 1);
+    for (const QString &choice : choices) {
+        if (!given.isEmpty() && choice.startsWith(given))
+            return choice;
+        const int slips = distance(given, choice);
+        if (slips <= tolerated) {
+            found = choice;
+            tolerated = slips - 1;
+        }
+    }
+    return found;
+}
+
 QString quoted(const QString &text)
 {
     return QLatin1Char('"') + text + QLatin1Char('"');
@@ -46,20 +62,14 @@ QString quoted(const QString &text)
 
 QString suggestion(const QString &given, const QStringList &choices)
 {
-    int nearest = std::numeric_limits<int>::max();
-    QString candidate;
+    const QString candidate = nearest(given.toLower(), choices);
+    if (!candidate.isEmpty())
+        return QStringLiteral("did you mean %1?").arg(quoted(candidate));
     QStringList all;
-    for (const QString &choice : choices) {
-        const int steps = distance(given.toLower(), choice);
-        if (steps < nearest) {
-            nearest = steps;
-            candidate = choice;
-        }
+    for (const QString &choice : choices)
         all.append(quoted(choice));
-    }
-    const QString list = QLatin1String("must be one of ") + all.join(QLatin1String(", "));
-    const bool plausible = nearest <= 2 && nearest < std::min(given.size(), candidate.size());
-    return plausible ? QStringLiteral("did you mean %1? It %2").arg(quoted(candidate), list) : list;
+    return (all.size() == 1 ? QLatin1String("must be ") : QLatin1String("must be one of "))
+        + all.join(QLatin1String(", "));
 }
 
 } // namespace Agent

@@ -10,7 +10,7 @@ namespace Corvane
 namespace Agent
 {
 
-/** "did you mean "block"?" for a slip of the keyboard, or else "must be one of ..." with all @p choices. */
+/** "did you mean "block"?" when one of @p choices is near to @p given, or else "must be one of ...". */
 QString suggestion(const QString &given, const QStringList &choices);
 
 } // namespace Agent
