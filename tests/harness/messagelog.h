@@ -1,0 +1,28 @@
+// SPDX-License-Identifier: LGPL-2.1-or-later
+#ifndef CORVANE_TEST_MESSAGELOG_H
+#define CORVANE_TEST_MESSAGELOG_H
+
+#include <QtCore/QStringList>
+#include <QtCore/QtGlobal>
+
+/** Collects what is logged while it lives, instead of printing it. One at a time. */
+class MessageLog
+{
+public:
+    MessageLog();
+    ~MessageLog();
+
+    /** Warnings since construction or the last call, oldest first. */
+    QStringList takeWarnings();
+
+private:
+    Q_DISABLE_COPY(MessageLog)
+
+    static void handle(QtMsgType type, const QMessageLogContext &context, const QString &message);
+
+    static MessageLog *s_current;
+    QtMessageHandler m_previous;
+    QStringList m_warnings;
+};
+
+#endif // CORVANE_TEST_MESSAGELOG_H

@@ -1,0 +1,62 @@
+// SPDX-License-Identifier: LGPL-2.1-or-later
+#ifndef CORVANE_TEST_PHONE_H
+#define CORVANE_TEST_PHONE_H
+
+#include <QtCore/QJsonObject>
+#include <QtCore/QStringList>
+#include <QtCore/QVariantList>
+#include <QtCore/QVariantMap>
+
+/**
+ * The simulated phone that the test runs in, steered through its control interface.
+ *
+ * A request that the phone refuses ends the test program: it is a mistake in the test.
+ */
+class Phone
+{
+public:
+    Phone();
+
+    void stopService(const QString &service);
+    void startService(const QString &service);
+
+    /** @p member fails with @p error from now on; an empty @p path stands for any. */
+    void failCalls(const QString &service, const QString &path, const QString &member, const QString &error,
+                   const QString &message);
+    /** @p member is answered with @p arguments from now on. */
+    void answerCalls(const QString &service, const QString &path, const QString &member,
+                     const QVariantList &arguments);
+    /** @p member is answered @p milliseconds later than it could be. */
+    void delayCalls(const QString &service, const QString &path, const QString &member, uint milliseconds);
+    /** @p member is never answered. */
+    void swallowCalls(const QString &service, const QString &path, const QString &member);
+    void clearFaults();
+
+    /** Emits a signal and waits until this process has taken it in. */
+    void emitSignal(const QString &service, const QString &path, const QString &interface,
+                    const QString &member, const QVariantList &arguments = QVariantList());
+
+    /**
+     * Waits until this process has taken in all that @p service has sent to it so far: what it sends is
+     * delivered in order, so the answer to one more call comes last.
+     */
+    void settle(const QString &service);
+
+    /** Calls received since construction or the last call, as "path member arguments"; without introspection.
+     */
+    QStringList takeJournal(const QString &service);
+
+    void act(const QString &action, const QStringList &arguments);
+    /** The phone's own view of its state. */
+    QJsonObject state() const;
+
+private:
+    void ping(const QString &service) const;
+    QVariantList control(const QString &method, const QVariantList &arguments = QVariantList()) const;
+    void setFault(const QString &service, const QString &path, const QString &member, const QString &kind,
+                  const QVariantMap &options);
+
+    quint64 m_journalPosition = 0;
+};
+
+#endif // CORVANE_TEST_PHONE_H

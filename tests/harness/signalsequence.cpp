@@ -1,0 +1,75 @@
+// SPDX-License-Identifier: LGPL-2.1-or-later
+#include "signalsequence.h"
+
+#include "waiting.h"
+
+#include <corvanemdm/simfilter.h>
+
+using Corvane::Mdm::SimFilter;
+
+namespace
+{
+
+QString text(const SimFilter::Rule &rule)
+{
+    static const char *const actions[] = {"?", "block", "allow", "hangup"};
+    return rule.imsi + QLatin1Char(':') + QLatin1String(actions[rule.action]);
+}
+
+QString text(int type, const void *value)
+{
+    if (type == qMetaTypeId<SimFilter::Rule>())
+        return text(*static_cast<const SimFilter::Rule *>(value));
+    if (type == qMetaTypeId<SimFilter::RuleList>()) {
+        QStringList rules;
+        for (const SimFilter::Rule &rule : *static_cast<const SimFilter::RuleList *>(value))
+            rules.append(text(rule));
+        return QLatin1Char('[') + rules.join(QLatin1Char(' ')) + QLatin1Char(']');
+    }
+    if (type == QMetaType::UnknownType)
+        return QStringLiteral("<type unknown to the meta-object system>");
+    return QVariant(type, value).toString();
+}
+
+} // namespace
+
+SignalSequence::SignalSequence(QObject *object)
+{
+    const QMetaObject *metaObject = object->metaObject();
+    const int firstSlot = QObject::staticMetaObject.methodCount();
+    for (int index = metaObject->methodOffset(); index < metaObject->methodCount(); ++index) {
+        const QMetaMethod method = metaObject->method(index);
+        if (method.methodType() != QMetaMethod::Signal)
+            continue;
+        QMetaObject::connect(object, index, this, firstSlot + m_signals.size(), Qt::DirectConnection,
+                             nullptr);
+        m_signals.append(method);
+    }
+}
+
+QStringList SignalSequence::take()
+{
+    QStringList seen;
+    seen.swap(m_seen);
+    return seen;
+}
+
+bool SignalSequence::waitFor(int count)
+{
+    return waitUntil([&] { return m_seen.size() >= count; });
+}
+
+int SignalSequence::qt_metacall(QMetaObject::Call call, int id, void **arguments)
+{
+    id = QObject::qt_metacall(call, id, arguments);
+    if (id < 0 || call != QMetaObject::InvokeMetaMethod)
+        return id;
+
+    const QMetaMethod &method = m_signals.at(id);
+    QStringList texts;
+    for (int index = 0; index < method.parameterCount(); ++index)
+        texts.append(text(method.parameterType(index), arguments[index + 1]));
+    m_seen.append(QString::fromLatin1(method.name()) + QLatin1Char('(') + texts.join(QLatin1String(", "))
+                  + QLatin1Char(')'));
+    return -1;
+}

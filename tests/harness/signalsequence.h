@@ -1,0 +1,34 @@
+// SPDX-License-Identifier: LGPL-2.1-or-later
+#ifndef CORVANE_TEST_SIGNALSEQUENCE_H
+#define CORVANE_TEST_SIGNALSEQUENCE_H
+
+#include <QtCore/QMetaMethod>
+#include <QtCore/QObject>
+#include <QtCore/QStringList>
+#include <QtCore/QVector>
+
+/**
+ * Records every signal that the class of an object declares, in the order of emission and with its arguments,
+ * as "name(argument, argument)". Rules read "244:block", lists of rules "[244:block 262:allow]".
+ *
+ * Connects through the meta-object alone, as a binding to another language would.
+ */
+class SignalSequence : public QObject
+{
+public:
+    explicit SignalSequence(QObject *object);
+
+    const QStringList &signalsSeen() const { return m_seen; }
+    /** The signals since construction or the last call. */
+    QStringList take();
+    /** Waits until @p count signals have been seen. */
+    bool waitFor(int count);
+
+    int qt_metacall(QMetaObject::Call call, int id, void **arguments) override;
+
+private:
+    QVector<QMetaMethod> m_signals;
+    QStringList m_seen;
+};
+
+#endif // CORVANE_TEST_SIGNALSEQUENCE_H
