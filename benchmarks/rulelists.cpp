@@ -51,7 +51,8 @@ struct Lists {
     SimFilterPrivate::RulePrivateList demarshalNext()
     {
         next = !next;
-        return qdbus_cast<SimFilterPrivate::RulePrivateList>(lists[next]);
+        const QDBusArgument unread = lists[next]; // reading advances the one that is read
+        return qdbus_cast<SimFilterPrivate::RulePrivateList>(unread);
     }
 
     QDBusArgument lists[2];

@@ -51,6 +51,7 @@ public:
     QJsonObject state() const;
 
 private:
+    void ping(const QString &service) const;
     QVariantList control(const QString &method, const QVariantList &arguments = QVariantList()) const;
     void setFault(const QString &service, const QString &path, const QString &member, const QString &kind,
                   const QVariantMap &options);
