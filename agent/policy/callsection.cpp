@@ -13,8 +13,8 @@ using Mdm::SimFilter;
 namespace
 {
 
-constexpr QLatin1String defaultMember("default");
-constexpr QLatin1String rulesMember("rules");
+const QLatin1String defaultMember("default");
+const QLatin1String rulesMember("rules");
 
 QString pathOf(CallDirection direction, QLatin1String member)
 {

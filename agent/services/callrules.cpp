@@ -27,8 +27,8 @@ constexpr NamedAction actions[] = {
     {SimFilter::Hangup, QLatin1String("hangup"), true},
 };
 
-constexpr QLatin1String imsiMember("imsi");
-constexpr QLatin1String actionMember("action");
+const QLatin1String imsiMember("imsi");
+const QLatin1String actionMember("action");
 
 bool fits(const NamedAction &named, CallDirection direction)
 {
