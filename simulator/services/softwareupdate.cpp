@@ -179,8 +179,10 @@ void SoftwareUpdate::unregisterClient(const QString &client)
 void SoftwareUpdate::tellClients(const QString &signal, GVariant *arguments) const
 {
     const Variant values(arguments);
+    // Each emission uses up a reference.
     for (const auto &[client, times] : m_clients)
-        m_service->emitSignal(objectPath, interfaceName, signal, values.get(), client);
+        m_service->emitSignal(objectPath, interfaceName, signal,
+                              values ? g_variant_ref(values.get()) : nullptr, client);
 }
 
 void SoftwareUpdate::tellFailure(const QString &reason) const
