@@ -21,7 +21,7 @@ struct NamedAction {
     bool incomingOnly;
 };
 
-constexpr NamedAction actions[] = {
+const NamedAction actions[] = {
     {SimFilter::Block, QLatin1String("block"), false},
     {SimFilter::Allow, QLatin1String("allow"), false},
     {SimFilter::Hangup, QLatin1String("hangup"), true},
