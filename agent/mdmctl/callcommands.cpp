@@ -42,7 +42,7 @@ QString ruleFault(const QString &rule)
 {
     const int equals = rule.indexOf(QLatin1Char('='));
     if (equals < 0)
-        return QStringLiteral("must be an IMSI, \"=\" and an action, as in 244120000000001=block");
+        return QStringLiteral("must be an IMSI, \"=\" and an action, as in 244051234567890=block");
     const QString fault = imsiFault(rule.left(equals));
     const QString action = rule.mid(equals + 1);
     if (!fault.isEmpty() || actionNamed(CallDirection::Incoming, action))
@@ -276,7 +276,7 @@ Command command(const QString &name, const QString &summary, const QVector<Argum
 
 const QString changeJson = QStringLiteral(
     "JSON, after the change: {\"changed\": true, \"direction\": \"dial\", \"default\": \"allow\",\n"
-    "\"rules\": [{\"imsi\": \"244120000000001\", \"action\": \"block\"}]}");
+    "\"rules\": [{\"imsi\": \"244051234567890\", \"action\": \"block\"}]}");
 
 } // namespace
 
@@ -292,7 +292,7 @@ Command callsCommand()
         actionNames(CallDirection::Incoming),
         {}};
     const Argument rules{ruleArgument,
-                         QStringLiteral("A rule, such as 244120000000001=block"),
+                         QStringLiteral("A rule, such as 244051234567890=block"),
                          {},
                          ruleFault,
                          Argument::Word,
@@ -302,7 +302,7 @@ Command callsCommand()
                            QStringLiteral("Show the rules and defaults of both directions"), {}, runShow);
     show.description
         = QStringLiteral("JSON: {\"dial\": {\"default\": \"allow\", \"rules\": [{\"imsi\": "
-                         "\"244120000000001\",\n\"action\": \"block\"}]}, \"incoming\": {...}}, as "
+                         "\"244051234567890\",\n\"action\": \"block\"}]}, \"incoming\": {...}}, as "
                          "\"calls\" in a policy.");
 
     Command add = command(QStringLiteral("add"),
@@ -312,22 +312,22 @@ Command callsCommand()
         = QStringLiteral("Waits until the phone confirms the rule and prints what then holds. A rule that "
                          "is\nthere already is left as it is, with exit status 0.\n\n"
                          "Examples:\n"
-                         "  mdmctl calls add dial 244120000000001 block\n"
-                         "  mdmctl calls add incoming 244120000000001 hangup\n\n")
+                         "  mdmctl calls add dial 244051234567890 block\n"
+                         "  mdmctl calls add incoming 244051234567890 hangup\n\n")
         + changeJson;
 
     Command remove = command(QStringLiteral("remove"), QStringLiteral("Remove the rule of a SIM"),
                              {direction, imsi}, runRemove);
     remove.description = QStringLiteral("A rule that is not there cannot be removed: exit status 1.\n\n"
                                         "Example:\n"
-                                        "  mdmctl calls remove dial 244120000000001\n\n")
+                                        "  mdmctl calls remove dial 244051234567890\n\n")
         + changeJson;
 
     Command set = command(QStringLiteral("set"), QStringLiteral("Replace all rules of a direction"),
                           {direction, rules}, runSet);
     set.description
         = QStringLiteral("Example:\n"
-                         "  mdmctl calls set dial 244120000000001=block 244120000000002=allow\n\n")
+                         "  mdmctl calls set dial 244051234567890=block 262021234567891=allow\n\n")
         + changeJson;
 
     Command clear = command(QStringLiteral("clear"), QStringLiteral("Remove all rules of a direction"),

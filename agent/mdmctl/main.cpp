@@ -21,7 +21,7 @@ Command program()
     mdmctl.summary = QStringLiteral("Manages this phone: what it may do, and what is installed on it.");
     mdmctl.description = QStringLiteral("Examples:\n"
                                         "  mdmctl update status\n"
-                                        "  mdmctl calls add dial 244120000000001 block\n"
+                                        "  mdmctl calls add dial 244051234567890 block\n"
                                         "  mdmctl policy check company-phone.json\n"
                                         "\n"
                                         "Results go to standard output, as tables or, with --json, as JSON; "

@@ -16,6 +16,14 @@ QStringList linesOf(const QString &cell)
     return cell.split(QLatin1Char('\n'));
 }
 
+QString trimmedEnd(const QString &line)
+{
+    int end = line.size();
+    while (end > 0 && line.at(end - 1).isSpace())
+        --end;
+    return line.left(end);
+}
+
 QStringList rowLines(const QStringList &cells, const QVector<int> &widths)
 {
     QStringList lines;
@@ -31,6 +39,7 @@ QStringList rowLines(const QStringList &cells, const QVector<int> &widths)
         }
         start += widths.at(column) + 2;
     }
+    std::transform(lines.begin(), lines.end(), lines.begin(), trimmedEnd);
     return lines;
 }
 

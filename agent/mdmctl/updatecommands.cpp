@@ -190,7 +190,7 @@ Command updateCommand()
                              QStringLiteral("Tell which update the last check found"), runStatus);
     status.description
         = QStringLiteral("Asks the phone for what it knows; \"mdmctl update check\" makes it look.\n\n"
-                         "JSON: {\"available\": true, \"version\": \"4.6.0\"}; the version is null "
+                         "JSON: {\"available\": true, \"version\": \"5.0.0.73\"}; the version is null "
                          "when there is no update.");
 
     Command check
@@ -209,12 +209,13 @@ Command updateCommand()
             Argument::Word,
             Argument::Optional}};
     download.options.append(silenceOption());
-    download.description = QStringLiteral("Shows progress on standard error, and ends when the download is "
-                                          "complete.\n\n"
-                                          "Examples:\n"
-                                          "  mdmctl update download\n"
-                                          "  mdmctl update download 4.6.0\n\n"
-                                          "JSON, at the end: {\"downloaded\": true, \"version\": \"4.6.0\"}");
+    download.description
+        = QStringLiteral("Shows progress on standard error, and ends when the download is "
+                         "complete.\n\n"
+                         "Examples:\n"
+                         "  mdmctl update download\n"
+                         "  mdmctl update download 5.0.0.73\n\n"
+                         "JSON, at the end: {\"downloaded\": true, \"version\": \"5.0.0.73\"}");
 
     Command install
         = command(QStringLiteral("install"), QStringLiteral("Install the downloaded update"), runInstall);
@@ -226,7 +227,7 @@ Command updateCommand()
                          "Example:\n"
                          "  mdmctl update check && mdmctl update download && mdmctl update install "
                          "--wait\n\n"
-                         "JSON: {\"installed\": true, \"started\": true, \"version\": \"4.6.0\"}");
+                         "JSON: {\"installed\": true, \"started\": true, \"version\": \"5.0.0.73\"}");
 
     Command watch
         = command(QStringLiteral("watch"), QStringLiteral("Follow what happens to updates"), runWatch);

@@ -17,8 +17,9 @@ namespace
 
 void failWith(Wait *wait, const SoftwareUpdate *updates)
 {
-    QObject::connect(updates, &SoftwareUpdate::softwareUpdateFailed, wait,
-                     [wait](const QString &reason) { wait->end(Reply::Refused, reason); });
+    QObject::connect(updates, &SoftwareUpdate::softwareUpdateFailed, wait, [wait](const QString &reason) {
+        wait->end(Reply::Refused, QLatin1String("the phone reports: ") + reason);
+    });
 }
 
 } // namespace
