@@ -108,6 +108,10 @@ int main(int argc, char *argv[])
         settings.realDaemons = realDaemonsNamed(realNames);
     } catch (const CLI::Success &success) {
         return app.exit(success);
+    } catch (const CLI::ExtrasError &error) {
+        std::fprintf(stderr, "corvane-simulator: %s; there are --device, --real, --version and --help\n",
+                     error.what());
+        return wrongUsage;
     } catch (const CLI::ParseError &error) {
         std::fprintf(stderr, "corvane-simulator: %s; see corvane-simulator --help\n", error.what());
         return wrongUsage;

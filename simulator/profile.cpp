@@ -70,11 +70,12 @@ Profile readProfile(const QString &fileName)
     if (!document.isValid())
         return {{}, document.error};
 
+    const QString documentName = fileName == QLatin1String("-") ? QStringLiteral("standard input") : fileName;
     const QJsonObject profile = completed(document.object, builtIn.object);
     for (const ComponentType &type : ComponentRegistration::all()) {
         const QString problem = type.problemOf(profile);
         if (!problem.isEmpty())
-            return {{}, fileName + QStringLiteral(": ") + problem};
+            return {{}, documentName + QStringLiteral(": ") + problem};
     }
     return {profile, QString()};
 }

@@ -481,6 +481,18 @@ void act(const Phone &phone, const std::vector<std::string> &words)
     throw Failure{Refused, "there is no action \"" + given + "\"; " + advice(given, known)};
 }
 
+/** The arguments as CLI11 wants them: in reverse, and no value in brackets, which it would take apart. */
+std::vector<std::string> argumentsForParser(int argc, char *argv[])
+{
+    std::vector<std::string> arguments(std::make_reverse_iterator(argv + argc),
+                                       std::make_reverse_iterator(argv + 1));
+    for (std::string &argument : arguments) {
+        if (argument.rfind('[', 0) == 0)
+            argument.insert(0, " ");
+    }
+    return arguments;
+}
+
 } // namespace
 
 int main(int argc, char *argv[])
@@ -578,6 +590,7 @@ int main(int argc, char *argv[])
 
     add("act", "do something to the phone", [&](Phone &phone) { act(phone, words); })
         ->add_option("ACTION", words, "words of an action and its arguments; see \"actions\"")
+
         ->required();
     add("actions", "list what can be done to the phone", showActions);
 
@@ -588,7 +601,7 @@ int main(int argc, char *argv[])
         if (argc > 1 && argv[1][0] != '-' && std::find(known.begin(), known.end(), argv[1]) == known.end())
             throw Failure{WrongUsage,
                           std::string("there is no command \"") + argv[1] + "\"; " + advice(argv[1], known)};
-        app.parse(argc, argv);
+        app.parse(argumentsForParser(argc, argv));
         Phone phone;
         chosen(phone);
     } catch (const CLI::Success &success) {
