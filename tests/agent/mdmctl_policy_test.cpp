@@ -567,7 +567,7 @@ void MdmctlPolicyTest::watchTakesUpAServiceThatComesBack()
     m_phone.startService(Ofono);
     QVERIFY(watch.waitForOutput(QStringLiteral("calls.dial.default: compliant\n")));
     call(Dial, QStringLiteral("SetDefaultAction"), {2u});
-    QVERIFY(watch.waitForOutput(QStringLiteral("calls.dial.default: changed\n"), 2));
+    QVERIFY(watch.waitForOutput(QStringLiteral("calls.dial.default: changed (from allow to block)\n"), 2));
     QCOMPARE(filter(QStringLiteral("dial")).value(QLatin1String("default")).toString(),
              QStringLiteral("block"));
     watch.interrupt(SIGINT);
@@ -612,7 +612,7 @@ void MdmctlPolicyTest::watchDoesNotRepeatARefusedChange()
              QStringList(Dial + QStringLiteral(" SetDefaultAction (uint32 1,)")));
     m_phone.clearFaults();
     call(Dial, QStringLiteral("AddRule"), {QStringLiteral("1"), 1u});
-    QVERIFY(watch.waitForOutput(QStringLiteral("calls.dial.default: changed\n")));
+    QVERIFY(watch.waitForOutput(QStringLiteral("calls.dial.default: changed (from allow to block)\n")));
     watch.interrupt(SIGINT);
     QCOMPARE(watch.finish().status, 0);
 }
