@@ -127,10 +127,11 @@ int runApply(PolicyEngine &engine, const Policy &policy, const Values &values)
 
 QString reportLine(const Setting &setting)
 {
-    QString line = QStringLiteral("%1: %2").arg(setting.path, setting.statusName());
-    if (!setting.detail.isEmpty())
-        line += QStringLiteral(" (%1)").arg(setting.detail);
-    return line;
+    QString why = setting.detail;
+    if (why.isEmpty() && setting.status == Setting::Changed)
+        why = QStringLiteral("from %1 to %2").arg(setting.present.text, setting.wanted.text);
+    const QString line = QStringLiteral("%1: %2").arg(setting.path, setting.statusName());
+    return why.isEmpty() ? line : QStringLiteral("%1 (%2)").arg(line, why);
 }
 
 int runWatch(PolicyEngine &engine, const Policy &policy, const Values &values)

@@ -6,7 +6,6 @@
 
 #include <algorithm>
 #include <cstdio>
-#include <cstdlib>
 #include <vector>
 
 namespace Corvane
@@ -69,8 +68,6 @@ void WarningCapture::handle(QtMsgType type, const QMessageLogContext &, const QS
     }
     const QByteArray line = messagePrefix + "warning: " + message.toLocal8Bit() + '\n';
     std::fwrite(line.constData(), 1, std::size_t(line.size()), stderr);
-    if (type == QtFatalMsg)
-        std::abort();
 }
 
 bool WarningCapture::take(const QString &message) const

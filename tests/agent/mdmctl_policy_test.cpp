@@ -1,4 +1,5 @@
 // SPDX-License-Identifier: LGPL-2.1-or-later
+#include "callalarm.h"
 #include "mdmctl.h"
 #include "phone.h"
 #include "waiting.h"
@@ -103,6 +104,7 @@ private:
     QString publish();
 
     Phone m_phone;
+    CallAlarm m_alarm;
     QTemporaryDir m_folder;
     int m_versions = 0;
 };
@@ -244,7 +246,7 @@ void MdmctlPolicyTest::wrongPolicyIsRefusedWithThePath_data()
     QTest::addColumn<QByteArray>("policy");
     QTest::addColumn<QString>("error");
 
-    QTest::newRow("syntax") << QByteArray("{\n\"calls\": }") << R"(FILE:2:10: illegal value)";
+    QTest::newRow("syntax") << QByteArray("{\n\"calls\": ,}") << R"(FILE:2:10: illegal value)";
     QTest::newRow("unknown family")
         << QByteArray(R"({"call": {}})")
         << R"(FILE: unknown member "call": must be one of "$schema", "calls", "description", "name", "softwareUpdate")";
@@ -532,15 +534,17 @@ void MdmctlPolicyTest::watchAppliesAndPutsDriftRight()
 
 void MdmctlPolicyTest::watchFollowsTheSims()
 {
-    m_phone.act(QStringLiteral("sim pull"), {QStringLiteral("2")});
+    m_phone.act(QStringLiteral("sim pull"), {QStringLiteral("1")});
     Mdmctl watch({QStringLiteral("policy"), QStringLiteral("watch"),
                   write(R"({"calls": {"dial": {"rules": [{"imsi": "*", "action": "block"}]}}})")});
     QVERIFY(watch.waitForOutput(QStringLiteral("Watching for drift from ")));
     QCOMPARE(filter(QStringLiteral("dial")),
              json(R"({"default": "allow", "rules": [{"imsi": "244051234567890", "action": "block"}]})"));
-    m_phone.act(QStringLiteral("sim insert"), {QStringLiteral("2"), QStringLiteral("262029999999999")});
+    m_phone.act(QStringLiteral("sim insert"), {QStringLiteral("1"), QStringLiteral("262029999999999")});
     QVERIFY(watch.waitForOutput(QStringLiteral("calls.dial.rules: changed (add 262029999999999=block)\n")));
-    m_phone.act(QStringLiteral("sim insert"), {QStringLiteral("2"), QStringLiteral("262021234567891")});
+    m_phone.act(QStringLiteral("sim pull"), {QStringLiteral("1")});
+    QVERIFY(watch.waitForOutput(QStringLiteral("calls.dial.rules: changed (remove 262029999999999)\n")));
+    m_phone.act(QStringLiteral("sim insert"), {QStringLiteral("1"), QStringLiteral("262021234567891")});
     QVERIFY(watch.waitForOutput(QStringLiteral("add 262021234567891=block")));
     QVERIFY(waitUntil([this] {
         return filter(QStringLiteral("dial"))
@@ -563,7 +567,7 @@ void MdmctlPolicyTest::watchTakesUpAServiceThatComesBack()
     m_phone.startService(Ofono);
     QVERIFY(watch.waitForOutput(QStringLiteral("calls.dial.default: compliant\n")));
     call(Dial, QStringLiteral("SetDefaultAction"), {2u});
-    QVERIFY(watch.waitForOutput(QStringLiteral("calls.dial.default: changed\n"), 2));
+    QVERIFY(watch.waitForOutput(QStringLiteral("calls.dial.default: changed (from allow to block)\n"), 2));
     QCOMPARE(filter(QStringLiteral("dial")).value(QLatin1String("default")).toString(),
              QStringLiteral("block"));
     watch.interrupt(SIGINT);
@@ -608,7 +612,7 @@ void MdmctlPolicyTest::watchDoesNotRepeatARefusedChange()
              QStringList(Dial + QStringLiteral(" SetDefaultAction (uint32 1,)")));
     m_phone.clearFaults();
     call(Dial, QStringLiteral("AddRule"), {QStringLiteral("1"), 1u});
-    QVERIFY(watch.waitForOutput(QStringLiteral("calls.dial.default: changed\n")));
+    QVERIFY(watch.waitForOutput(QStringLiteral("calls.dial.default: changed (from allow to block)\n")));
     watch.interrupt(SIGINT);
     QCOMPARE(watch.finish().status, 0);
 }
