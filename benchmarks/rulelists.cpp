@@ -13,9 +13,9 @@ using Corvane::Mdm::SimFilterPrivate;
 namespace
 {
 
-constexpr QLatin1String Service("org.ofono");
-constexpr QLatin1String Path("/mdm/voicecallfilter/dial");
-constexpr QLatin1String Interface("org.corvaneos.ofono.mdm.VoiceCallFilter");
+const QLatin1String Service("org.ofono");
+const QLatin1String Path("/mdm/voicecallfilter/dial");
+const QLatin1String Interface("org.corvaneos.ofono.mdm.VoiceCallFilter");
 
 SimFilterPrivate::RulePrivateList makeRules(int count, qint64 firstImsi)
 {

@@ -71,7 +71,8 @@ void addRow(Table *table, const CallFilter &filter, CallDirection direction)
 {
     QStringList imsis;
     QStringList ruleActions;
-    for (const SimFilter::Rule &rule : filter.rules(direction)) {
+    const SimFilter::RuleList rules = filter.rules(direction);
+    for (const SimFilter::Rule &rule : rules) {
         imsis.append(rule.imsi);
         ruleActions.append(actionName(rule.action));
     }

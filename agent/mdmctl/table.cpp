@@ -62,7 +62,8 @@ QVector<int> Table::columnWidths() const
         const bool used = std::any_of(m_rows.cbegin() + 1, m_rows.cend(),
                                       [column](const QStringList &row) { return !row.at(column).isEmpty(); });
         for (const QStringList &row : m_rows) {
-            for (const QString &line : linesOf(used ? row.at(column) : QString()))
+            const QStringList lines = linesOf(used ? row.at(column) : QString());
+            for (const QString &line : lines)
                 widths[column] = std::max(widths.at(column), line.size());
         }
     }

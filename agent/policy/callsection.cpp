@@ -13,8 +13,8 @@ using Mdm::SimFilter;
 namespace
 {
 
-constexpr QLatin1String defaultMember("default");
-constexpr QLatin1String rulesMember("rules");
+const QLatin1String defaultMember("default");
+const QLatin1String rulesMember("rules");
 
 QString pathOf(CallDirection direction, QLatin1String member)
 {
@@ -34,8 +34,9 @@ Setting::Value rulesValue(const SimFilter::RuleList &rules)
 bool namesEverySim(const QJsonObject &wanted)
 {
     for (const CallDirection direction : allCallDirections) {
-        const QJsonArray rules = wantedFor(direction, wanted).value(rulesMember).toArray();
-        for (const SimFilter::Rule &rule : rulesFromJson(rules)) {
+        const SimFilter::RuleList rules
+            = rulesFromJson(wantedFor(direction, wanted).value(rulesMember).toArray());
+        for (const SimFilter::Rule &rule : rules) {
             if (rule.imsi == AnySim)
                 return true;
         }
@@ -127,7 +128,8 @@ void CallSection::close()
 QVector<Setting> CallSection::compare(const QJsonObject &wanted)
 {
     QVector<Setting> compared;
-    for (const Setting &setting : settings(wanted)) {
+    const QVector<Setting> named = settings(wanted);
+    for (const Setting &setting : named) {
         for (const CallDirection direction : allCallDirections) {
             if (setting.path == pathOf(direction, defaultMember))
                 compared.append(compareDefault(setting, direction));

@@ -49,11 +49,11 @@ namespace Agent
 namespace
 {
 
-constexpr QLatin1String managerInterface("org.ofono.Manager");
-constexpr QLatin1String modemInterface("org.ofono.Modem");
-constexpr QLatin1String simInterface("org.ofono.SimManager");
-constexpr QLatin1String identity("SubscriberIdentity");
-constexpr QLatin1String present("Present");
+const QLatin1String managerInterface("org.ofono.Manager");
+const QLatin1String modemInterface("org.ofono.Modem");
+const QLatin1String simInterface("org.ofono.SimManager");
+const QLatin1String identity("SubscriberIdentity");
+const QLatin1String present("Present");
 
 QDBusPendingCall call(const QString &path, const QString &interface, const QString &method)
 {

@@ -11,8 +11,8 @@ namespace Agent
 namespace
 {
 
-constexpr QLatin1String installMember("install");
-constexpr QLatin1String latest("latest");
+const QLatin1String installMember("install");
+const QLatin1String latest("latest");
 
 } // namespace
 

@@ -21,14 +21,14 @@ struct NamedAction {
     bool incomingOnly;
 };
 
-constexpr NamedAction actions[] = {
+const NamedAction actions[] = {
     {SimFilter::Block, QLatin1String("block"), false},
     {SimFilter::Allow, QLatin1String("allow"), false},
     {SimFilter::Hangup, QLatin1String("hangup"), true},
 };
 
-constexpr QLatin1String imsiMember("imsi");
-constexpr QLatin1String actionMember("action");
+const QLatin1String imsiMember("imsi");
+const QLatin1String actionMember("action");
 
 bool fits(const NamedAction &named, CallDirection direction)
 {

@@ -18,14 +18,14 @@ namespace Simulator
 namespace
 {
 
-constexpr QLatin1String managerPath("/");
-constexpr QLatin1String managerInterface("org.ofono.Manager");
-constexpr QLatin1String modemInterface("org.ofono.Modem");
-constexpr QLatin1String simInterface("org.ofono.SimManager");
-constexpr QLatin1String propertyChanged("PropertyChanged");
+const QLatin1String managerPath("/");
+const QLatin1String managerInterface("org.ofono.Manager");
+const QLatin1String modemInterface("org.ofono.Modem");
+const QLatin1String simInterface("org.ofono.SimManager");
+const QLatin1String propertyChanged("PropertyChanged");
 
-constexpr QLatin1String poweredProperty("Powered");
-constexpr QLatin1String onlineProperty("Online");
+const QLatin1String poweredProperty("Powered");
+const QLatin1String onlineProperty("Online");
 
 using Properties = std::vector<std::pair<QString, Variant>>;
 
@@ -359,7 +359,7 @@ QString Modems::insertSim(const QStringList &arguments)
         throw Refusal(QStringLiteral("The SIM %1 is in another slot; pull it there first").arg(imsi));
 
     if (imsi != sim.imsi)
-        sim = Phone::cardWithImsi(imsi);
+        sim = m_phone.cardWithImsi(imsi);
     sim.present = true;
     m_modems[index].insertSim();
     return QStringLiteral("The SIM %1 is in slot %2").arg(imsi).arg(index);

@@ -95,10 +95,16 @@ void Phone::clearFaults()
     control(QStringLiteral("ClearFaults"));
 }
 
-void Phone::emitSignal(const QString &service, const QString &path, const QString &interface,
+void Phone::sendSignal(const QString &service, const QString &path, const QString &interface,
                        const QString &member, const QVariantList &arguments)
 {
     control(QStringLiteral("EmitSignal"), {service, path, interface, member, asVariants(arguments)});
+}
+
+void Phone::emitSignal(const QString &service, const QString &path, const QString &interface,
+                       const QString &member, const QVariantList &arguments)
+{
+    sendSignal(service, path, interface, member, arguments);
     settle(service);
 }
 
