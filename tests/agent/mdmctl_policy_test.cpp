@@ -253,10 +253,10 @@ void MdmctlPolicyTest::wrongPolicyIsRefusedWithThePath_data()
     QTest::newRow("syntax") << QByteArray("{\n\"calls\": ,}") << R"(FILE:2:10: illegal value)";
     QTest::newRow("unknown family")
         << QByteArray(R"({"call": {}})")
-        << R"(FILE: unknown member "call": must be one of "$schema", "calls", "description", "name", "softwareUpdate")";
+        << R"(FILE: /call: unknown member; must be one of "$schema", "calls", "description", "name", "softwareUpdate")";
     QTest::newRow("unknown member")
         << QByteArray(R"({"calls": {"dail": {}}})")
-        << R"(FILE: /calls: unknown member "dail": must be one of "dial", "incoming")";
+        << R"(FILE: /calls/dail: unknown member; must be one of "dial", "incoming")";
     QTest::newRow("action of the other direction")
         << QByteArray(R"({"calls": {"dial": {"rules": [{"imsi": "1", "action": "hangup"}]}}})")
         << R"(FILE: /calls/dial/rules/0/action: must be one of "allow", "block"; is "hangup")";
