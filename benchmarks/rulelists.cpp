@@ -13,9 +13,9 @@ using Corvane::Mdm::SimFilterPrivate;
 namespace
 {
 
-constexpr QLatin1String Service("org.ofono");
-constexpr QLatin1String Path("/mdm/voicecallfilter/dial");
-constexpr QLatin1String Interface("org.corvaneos.ofono.mdm.VoiceCallFilter");
+const QLatin1String Service("org.ofono");
+const QLatin1String Path("/mdm/voicecallfilter/dial");
+const QLatin1String Interface("org.corvaneos.ofono.mdm.VoiceCallFilter");
 
 SimFilterPrivate::RulePrivateList makeRules(int count, qint64 firstImsi)
 {
@@ -51,7 +51,8 @@ struct Lists {
     SimFilterPrivate::RulePrivateList demarshalNext()
     {
         next = !next;
-        return qdbus_cast<SimFilterPrivate::RulePrivateList>(lists[next]);
+        const QDBusArgument unread = lists[next]; // reading advances the one that is read
+        return qdbus_cast<SimFilterPrivate::RulePrivateList>(unread);
     }
 
     QDBusArgument lists[2];

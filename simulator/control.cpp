@@ -15,9 +15,9 @@ namespace Simulator
 namespace
 {
 
-constexpr QLatin1String serviceName(ControlNames::service);
-constexpr QLatin1String objectPath(ControlNames::path);
-constexpr QLatin1String interfaceName(ControlNames::interface);
+const QLatin1String serviceName(ControlNames::service);
+const QLatin1String objectPath(ControlNames::path);
+const QLatin1String interfaceName(ControlNames::interface);
 
 GVariant *stringTuple(const QString &text)
 {

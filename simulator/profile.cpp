@@ -15,7 +15,7 @@ namespace Simulator
 namespace
 {
 
-constexpr QLatin1String builtInProfile(":/devices/dual-sim.json");
+const QLatin1String builtInProfile(":/devices/dual-sim.json");
 constexpr int longestHostName = 63;
 
 QByteArray schema()

@@ -58,6 +58,7 @@ public:
     /** Rules in the order in which the service keeps them. */
     typedef QList<SimFilter::Rule> RuleList;
 
+    /** Only the static members do anything. */
     explicit SimFilter(QObject *parent = nullptr);
     ~SimFilter() override;
 

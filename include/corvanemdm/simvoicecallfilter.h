@@ -47,15 +47,20 @@ class CORVANEMDM_EXPORT SimVoiceCallFilter : public QObject
                    NOTIFY incomingRulesChanged)
 
 public:
+    /** Looks the service up, which blocks, and asks for its rules; readyChanged() tells when they are there.
+     */
     explicit SimVoiceCallFilter(QObject *parent = nullptr);
     ~SimVoiceCallFilter() override;
 
+    /** False until readyChanged(), and for good where the service is absent. */
     bool ready() const;
 
+    /** SimFilter::Block until the object is ready. */
     SimFilter::Action defaultDialAction() const;
     /** Requests @p action for outgoing calls; Hangup, or the action that is set already, is refused. */
     bool setDefaultDialAction(SimFilter::Action action);
 
+    /** Empty until the object is ready. */
     SimFilter::RuleList dialRules() const;
     /**
      * Requests that @p rules replace the whole outgoing list. A list equal to the present one is refused, and
@@ -74,10 +79,12 @@ public:
     /** Requests an empty outgoing list; refused when it is empty already. */
     Q_INVOKABLE bool clearDialRules();
 
+    /** SimFilter::Block until the object is ready. */
     SimFilter::Action defaultIncomingAction() const;
     /** Requests @p action for incoming calls; the action that is set already is refused. */
     bool setDefaultIncomingAction(SimFilter::Action action);
 
+    /** Empty until the object is ready. */
     SimFilter::RuleList incomingRules() const;
     /** As setDialRules(), for incoming calls; Hangup is accepted too. */
     bool setIncomingRules(const SimFilter::RuleList &rules);
@@ -94,6 +101,7 @@ Q_SIGNALS:
     /** Both directions have been taken over; emitted once. */
     void readyChanged();
 
+    /** The service has another default action for outgoing calls. */
     void defaultDialActionChanged();
     /**
      * @p rule is new in the outgoing list, or has a new action. The service's announcement of a single rule
@@ -105,6 +113,7 @@ Q_SIGNALS:
     /** The outgoing list changed; comes before the signals about single rules. */
     void dialRulesChanged(const SimFilter::RuleList &oldRules, const SimFilter::RuleList &newRules);
 
+    /** As defaultDialActionChanged(), for incoming calls. */
     void defaultIncomingActionChanged();
     /** As dialRuleAdded(), for incoming calls. */
     void incomingRuleAdded(const SimFilter::Rule &rule);

@@ -37,6 +37,7 @@ class CORVANEMDM_EXPORT SoftwareUpdate : public QObject
     Q_OBJECT
 
 public:
+    /** Registers with the proxy as a client, which blocks; a proxy that is away is not reported. */
     explicit SoftwareUpdate(QObject *parent = nullptr);
     ~SoftwareUpdate() override;
 

@@ -18,14 +18,14 @@ namespace Simulator
 namespace
 {
 
-constexpr QLatin1String managerPath("/");
-constexpr QLatin1String managerInterface("org.ofono.Manager");
-constexpr QLatin1String modemInterface("org.ofono.Modem");
-constexpr QLatin1String simInterface("org.ofono.SimManager");
-constexpr QLatin1String propertyChanged("PropertyChanged");
+const QLatin1String managerPath("/");
+const QLatin1String managerInterface("org.ofono.Manager");
+const QLatin1String modemInterface("org.ofono.Modem");
+const QLatin1String simInterface("org.ofono.SimManager");
+const QLatin1String propertyChanged("PropertyChanged");
 
-constexpr QLatin1String poweredProperty("Powered");
-constexpr QLatin1String onlineProperty("Online");
+const QLatin1String poweredProperty("Powered");
+const QLatin1String onlineProperty("Online");
 
 using Properties = std::vector<std::pair<QString, Variant>>;
 

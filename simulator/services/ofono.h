@@ -13,7 +13,7 @@ namespace Simulator
 namespace Ofono
 {
 
-constexpr QLatin1String serviceName("org.ofono");
+const QLatin1String serviceName("org.ofono");
 
 inline MethodError invalidArguments(const QString &message)
 {

@@ -20,12 +20,12 @@ namespace Simulator
 namespace
 {
 
-constexpr QLatin1String serviceName("org.corvaneos.mdmproxy");
-constexpr QLatin1String objectPath("/Corvane/Mdm/Proxy/SoftwareUpdate");
-constexpr QLatin1String interfaceName("org.corvaneos.mdmproxy.softwareupdate");
+const QLatin1String serviceName("org.corvaneos.mdmproxy");
+const QLatin1String objectPath("/Corvane/Mdm/Proxy/SoftwareUpdate");
+const QLatin1String interfaceName("org.corvaneos.mdmproxy.softwareupdate");
 
-constexpr QLatin1String infoChanged("softwareUpdateInfoChanged");
-constexpr QLatin1String updateFailed("softwareUpdateFailed");
+const QLatin1String infoChanged("softwareUpdateInfoChanged");
+const QLatin1String updateFailed("softwareUpdateFailed");
 
 constexpr int progressStep = 10;
 constexpr int defaultSize = 100; // MiB
@@ -179,8 +179,10 @@ void SoftwareUpdate::unregisterClient(const QString &client)
 void SoftwareUpdate::tellClients(const QString &signal, GVariant *arguments) const
 {
     const Variant values(arguments);
+    // Each emission uses up a reference.
     for (const auto &[client, times] : m_clients)
-        m_service->emitSignal(objectPath, interfaceName, signal, values.get(), client);
+        m_service->emitSignal(objectPath, interfaceName, signal,
+                              values ? g_variant_ref(values.get()) : nullptr, client);
 }
 
 void SoftwareUpdate::tellFailure(const QString &reason) const

@@ -18,15 +18,15 @@ namespace Simulator
 namespace
 {
 
-constexpr QLatin1String interfaceName("org.corvaneos.ofono.mdm.VoiceCallFilter");
+const QLatin1String interfaceName("org.corvaneos.ofono.mdm.VoiceCallFilter");
 constexpr guint32 contractVersion = 1;
 constexpr int longestImsi = 15;
 
 enum Verdict : guint32 { Block = 1, Allow = 2, HangUp = 3 };
 
 /** The profile's words for the verdicts 1, 2 and 3. */
-constexpr std::array<QLatin1String, 3> verdictWords{QLatin1String("block"), QLatin1String("allow"),
-                                                    QLatin1String("hangup")};
+const std::array<QLatin1String, 3> verdictWords{QLatin1String("block"), QLatin1String("allow"),
+                                                QLatin1String("hangup")};
 
 QString word(guint32 verdict)
 {

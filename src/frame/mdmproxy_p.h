@@ -18,19 +18,20 @@ struct Endpoint {
     QLatin1String interface;
 };
 
-constexpr QLatin1String Service("org.corvaneos.mdmproxy");
+// Not constexpr: QLatin1String counts its characters with strlen, which Clang does not take for a constant.
+const QLatin1String Service("org.corvaneos.mdmproxy");
 
-constexpr Endpoint Accounts
+const Endpoint Accounts
     = {QLatin1String("/Corvane/Mdm/Proxy/Accounts"), QLatin1String("org.corvaneos.mdmproxy.accounts")};
-constexpr Endpoint CallStatistics = {QLatin1String("/Corvane/Mdm/Proxy/CallStatistics"),
-                                     QLatin1String("org.corvaneos.mdmproxy.callstatistics")};
-constexpr Endpoint LocationInfo = {QLatin1String("/Corvane/Mdm/Proxy/LocationInfo"),
-                                   QLatin1String("org.corvaneos.mdmproxy.locationinfo")};
-constexpr Endpoint NotificationInfo = {QLatin1String("/Corvane/Mdm/Proxy/NotificationInfo"),
-                                       QLatin1String("org.corvaneos.mdmproxy.notificationinfo")};
-constexpr Endpoint SoftwareUpdate = {QLatin1String("/Corvane/Mdm/Proxy/SoftwareUpdate"),
-                                     QLatin1String("org.corvaneos.mdmproxy.softwareupdate")};
-constexpr Endpoint Autostart
+const Endpoint CallStatistics = {QLatin1String("/Corvane/Mdm/Proxy/CallStatistics"),
+                                 QLatin1String("org.corvaneos.mdmproxy.callstatistics")};
+const Endpoint LocationInfo = {QLatin1String("/Corvane/Mdm/Proxy/LocationInfo"),
+                               QLatin1String("org.corvaneos.mdmproxy.locationinfo")};
+const Endpoint NotificationInfo = {QLatin1String("/Corvane/Mdm/Proxy/NotificationInfo"),
+                                   QLatin1String("org.corvaneos.mdmproxy.notificationinfo")};
+const Endpoint SoftwareUpdate = {QLatin1String("/Corvane/Mdm/Proxy/SoftwareUpdate"),
+                                 QLatin1String("org.corvaneos.mdmproxy.softwareupdate")};
+const Endpoint Autostart
     = {QLatin1String("/Corvane/Mdm/Proxy/Autostart"), QLatin1String("org.corvaneos.mdmproxy.autostart")};
 
 } // namespace MdmProxy

@@ -15,7 +15,7 @@ namespace Mdm
 namespace
 {
 
-constexpr QLatin1String OfonoService("org.ofono");
+const QLatin1String OfonoService("org.ofono");
 
 auto hasImsi(const QString &imsi)
 {

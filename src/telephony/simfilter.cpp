@@ -3,10 +3,12 @@
 
 #include "simfilter_p.h"
 
-#include <QtCore/QSet>
+#include <QtCore/QHashFunctions>
+#include <QtCore/QtMath>
 #include <QtDBus/QDBusMetaType>
 
 #include <algorithm>
+#include <vector>
 
 namespace Corvane
 {
@@ -165,34 +167,102 @@ SimFilter::Rule SimFilterPrivate::publicRuleFromPrivate(const RulePrivate &rule)
     return SimFilter::Rule();
 }
 
-// Beside the rule's class, where look-up by argument finds it; the conversion of a rule to a string would do
-// otherwise.
-static uint qHash(const SimFilter::Rule &rule, uint seed = 0)
-{
-    return ::qHash(rule.imsi, seed) ^ uint(rule.action);
-}
-
 namespace
 {
 
-// Calls back, in order, for each rule of [begin, end) whose key no rule of `others` has. Hashing the range
-// and going through the others keeps the cost linear, and that of a small range small, however long the other
-// list is.
-template <typename Key, typename Found>
-void forEachUnmatched(SimFilter::RuleList::const_iterator begin, SimFilter::RuleList::const_iterator end,
-                      const SimFilter::RuleList &others, Key key, Found found)
+bool sameRule(const SimFilter::Rule &one, const SimFilter::Rule &other)
+{
+    return one == other;
+}
+
+bool sameImsi(const SimFilter::Rule &one, const SimFilter::Rule &other)
+{
+    return one.imsi == other.imsi;
+}
+
+/**
+ * Finds the rules of a range that are the same as a given one, by the hash of their IMSIs.
+ *
+ * Long lists are compared while traffic waits for them, and a node of memory for each rule would cost more
+ * than the rest of an update: all that is here are two arrays.
+ */
+class RuleIndex
+{
+public:
+    using Iterator = SimFilter::RuleList::const_iterator;
+    using Same = bool (*)(const SimFilter::Rule &, const SimFilter::Rule &);
+
+    RuleIndex(Iterator begin, Iterator end, Same same)
+        : m_begin(begin)
+        , m_same(same)
+        , m_slots(std::size_t(qNextPowerOfTwo(quint32(2 * (end - begin)))))
+        , m_first(std::size_t(end - begin))
+        , m_matched(m_first.size())
+    {
+        for (int index = 0; index < int(m_first.size()); ++index) {
+            Slot &slot = find(begin[index]);
+            if (slot.index == Nothing)
+                slot.index = index;
+            m_first[std::size_t(index)] = slot.index;
+        }
+    }
+
+    /** From now on the rules that are the same as @p rule count as matched. */
+    void match(const SimFilter::Rule &rule)
+    {
+        const int index = find(rule).index;
+        if (index != Nothing)
+            m_matched[std::size_t(index)] = true;
+    }
+
+    bool isMatched(int index) const { return m_matched[std::size_t(m_first[std::size_t(index)])]; }
+
+private:
+    static constexpr int Nothing = -1;
+
+    struct Slot {
+        uint hash = 0;
+        int index = Nothing;
+    };
+
+    // The slot of the first rule that is the same, or the free one where it would be. Half of the slots are
+    // free.
+    Slot &find(const SimFilter::Rule &rule)
+    {
+        const uint hash = qHash(rule.imsi, uint(qGlobalQHashSeed()));
+        std::size_t position = hash;
+        for (;; ++position) {
+            Slot &slot = m_slots[position & (m_slots.size() - 1)];
+            if (slot.index == Nothing)
+                slot.hash = hash;
+            else if (slot.hash != hash || !m_same(m_begin[slot.index], rule))
+                continue;
+            return slot;
+        }
+    }
+
+    const Iterator m_begin;
+    const Same m_same;
+    std::vector<Slot> m_slots;
+    std::vector<int> m_first; // of each rule, the first one that is the same
+    std::vector<bool> m_matched;
+};
+
+// Calls back, in order, for each rule of [begin, end) that is the same as none of `others`. Indexing the
+// range and going through the others keeps the cost linear, and that of a small range small, however long the
+// other list is.
+template <typename Found>
+void forEachUnmatched(RuleIndex::Iterator begin, RuleIndex::Iterator end, const SimFilter::RuleList &others,
+                      RuleIndex::Same same, Found found)
 {
     if (begin == end)
         return;
 
-    QSet<std::decay_t<decltype(key(*begin))>> unmatched;
-    unmatched.reserve(int(end - begin));
-    for (auto rule = begin; rule != end; ++rule)
-        unmatched.insert(key(*rule));
+    RuleIndex index(begin, end, same);
     for (const SimFilter::Rule &other : others)
-        unmatched.remove(key(other));
-    for (auto rule = begin; rule != end && !unmatched.isEmpty(); ++rule) {
-        if (unmatched.contains(key(*rule)))
+        index.match(other);
+    for (auto rule = begin; rule != end; ++rule) {
+        if (!index.isMatched(int(rule - begin)))
             found(*rule);
     }
 }
@@ -204,13 +274,11 @@ SimFilter::RuleList SimFilterPrivate::addedRules(const SimFilter::RuleList &oldR
 {
     SimFilter::RuleList added;
     const Difference difference(oldRules, newRules);
-    forEachUnmatched(
-        newRules.begin() + difference.begin, newRules.begin() + difference.newEnd, oldRules,
-        [](const SimFilter::Rule &rule) { return rule; },
-        [&](const SimFilter::Rule &rule) {
-            if (includeHangup || rule.action != SimFilter::Hangup)
-                added.append(rule);
-        });
+    forEachUnmatched(newRules.begin() + difference.begin, newRules.begin() + difference.newEnd, oldRules,
+                     sameRule, [&](const SimFilter::Rule &rule) {
+                         if (includeHangup || rule.action != SimFilter::Hangup)
+                             added.append(rule);
+                     });
     return added;
 }
 
@@ -219,10 +287,8 @@ QStringList SimFilterPrivate::removedImsis(const SimFilter::RuleList &oldRules,
 {
     QStringList removed;
     const Difference difference(oldRules, newRules);
-    forEachUnmatched(
-        oldRules.begin() + difference.begin, oldRules.begin() + difference.oldEnd, newRules,
-        [](const SimFilter::Rule &rule) { return rule.imsi; },
-        [&](const SimFilter::Rule &rule) { removed.append(rule.imsi); });
+    forEachUnmatched(oldRules.begin() + difference.begin, oldRules.begin() + difference.oldEnd, newRules,
+                     sameImsi, [&](const SimFilter::Rule &rule) { removed.append(rule.imsi); });
     return removed;
 }
 

@@ -11,7 +11,7 @@ namespace Mdm
 namespace
 {
 
-constexpr QLatin1String Interface("org.corvaneos.ofono.mdm.VoiceCallFilter");
+const QLatin1String Interface("org.corvaneos.ofono.mdm.VoiceCallFilter");
 
 } // namespace
 

@@ -112,8 +112,9 @@ template <typename T> T FrameTest::thereAndBack(const T &value, QString *signatu
     QDBusMessage call = QDBusMessage::createMethodCall(QDBusConnection::systemBus().baseService(),
                                                        QStringLiteral("/"), Echo, QStringLiteral("echo"));
     call.setArguments({QVariant::fromValue(value)});
-    const QDBusPendingReply<T> reply = other.asyncCall(call);
-    if (!waitUntil([&] { return reply.isFinished(); }) || reply.isError())
+    const QDBusPendingCallWatcher watcher(other.asyncCall(call));
+    const QDBusPendingReply<T> reply = watcher;
+    if (!waitUntil([&] { return watcher.isFinished(); }) || reply.isError())
         qFatal("no echo: %s", qPrintable(reply.error().message()));
     QDBusConnection::systemBus().unregisterObject(QStringLiteral("/"));
     QDBusConnection::disconnectFromBus(name);
@@ -228,10 +229,10 @@ void FrameTest::objectPathPropertiesFromTheWire()
 {
     registerObjectPathProperties();
     registerObjectPathProperties();
-    const QDBusPendingReply<ObjectPathPropertiesList> reply = QDBusConnection::systemBus().asyncCall(
+    QDBusPendingReply<ObjectPathPropertiesList> reply = QDBusConnection::systemBus().asyncCall(
         QDBusMessage::createMethodCall(QStringLiteral("org.ofono"), QStringLiteral("/"),
                                        QStringLiteral("org.ofono.Manager"), QStringLiteral("GetModems")));
-    QVERIFY(waitUntil([&] { return reply.isFinished(); }));
+    reply.waitForFinished();
     QVERIFY2(!reply.isError(), qPrintable(reply.error().message()));
     const ObjectPathPropertiesList modems = reply.value();
     QCOMPARE(modems.size(), 2);

@@ -128,6 +128,7 @@ private Q_SLOTS:
 
     void constructionAsksForBothDirections();
     void becomesReadyOnceWithTheSecondAnswer();
+    void stateIsNewWhenItIsAnnounced();
     void defaultActionIsAnnouncedBeforeTheRules();
     void isNotReadyWhenOneAnswerFails_data();
     void isNotReadyWhenOneAnswerFails();
@@ -279,6 +280,24 @@ void SimVoiceCallFilterTest::becomesReadyOnceWithTheSecondAnswer()
     emitFrom(DialPath, "RulesChanged", {wire(QList<WireRule>())});
     QCOMPARE(seen.take(), texts({"dialRulesChanged([1:allow], [])", "dialRuleRemoved(1)"}));
     QVERIFY(filter.ready());
+}
+
+void SimVoiceCallFilterTest::stateIsNewWhenItIsAnnounced()
+{
+    setServiceRules(DialPath, {rule("1", SimFilter::Allow)}, SimFilter::Allow);
+    SimVoiceCallFilter filter;
+    bool readyAtSignal = false;
+    SimFilter::Action defaultAtSignal = SimFilter::Block;
+    RuleList rulesAtSignal;
+    connect(&filter, &SimVoiceCallFilter::readyChanged, this, [&] { readyAtSignal = filter.ready(); });
+    connect(&filter, &SimVoiceCallFilter::defaultDialActionChanged, this,
+            [&] { defaultAtSignal = filter.defaultDialAction(); });
+    connect(&filter, &SimVoiceCallFilter::dialRulesChanged, this,
+            [&] { rulesAtSignal = filter.dialRules(); });
+    QVERIFY(waitUntil([&] { return filter.ready(); }));
+    QVERIFY(readyAtSignal);
+    QCOMPARE(defaultAtSignal, SimFilter::Allow);
+    QCOMPARE(rulesAtSignal, RuleList({rule("1", SimFilter::Allow)}));
 }
 
 void SimVoiceCallFilterTest::defaultActionIsAnnouncedBeforeTheRules()

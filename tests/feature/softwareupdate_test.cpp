@@ -10,6 +10,7 @@
 #include <QtTest/QtTest>
 
 #include <memory>
+#include <thread>
 
 using Corvane::Mdm::SoftwareUpdate;
 
@@ -45,6 +46,7 @@ private Q_SLOTS:
     void cleanup();
 
     void registersWhileItLives();
+    void isConnectedBeforeItRegisters();
     void twoObjectsRegisterSeparatelyAndBothHear();
     void everySignalIsForwarded();
     void signalOfAnotherShapeIsNotForwarded();
@@ -83,6 +85,21 @@ void SoftwareUpdateTest::registersWhileItLives()
         QCOMPARE(m_phone->takeJournal(Service), QStringList(call("registerClient")));
     }
     QCOMPARE(m_phone->takeJournal(Service), QStringList(call("unregisterClient")));
+}
+
+void SoftwareUpdateTest::isConnectedBeforeItRegisters()
+{
+    // While the constructor waits for the answer, the proxy has something to tell its new client.
+    m_phone->delayCalls(Service, Path, QStringLiteral("registerClient"), 300);
+    std::thread proxy([this] {
+        while (!m_phone->takeJournal(Service).contains(call("registerClient"))) { }
+        m_phone->sendSignal(Service, Path, Interface, QStringLiteral("softwareUpdateDownloadProgress"), {7});
+    });
+    SoftwareUpdate update;
+    SignalSequence seen(&update);
+    proxy.join();
+    m_phone->settle(Service);
+    QCOMPARE(seen.take(), texts({"softwareUpdateDownloadProgress(7)"}));
 }
 
 void SoftwareUpdateTest::twoObjectsRegisterSeparatelyAndBothHear()

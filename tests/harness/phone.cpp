@@ -95,21 +95,26 @@ void Phone::clearFaults()
     control(QStringLiteral("ClearFaults"));
 }
 
-void Phone::emitSignal(const QString &service, const QString &path, const QString &interface,
+void Phone::sendSignal(const QString &service, const QString &path, const QString &interface,
                        const QString &member, const QVariantList &arguments)
 {
     control(QStringLiteral("EmitSignal"), {service, path, interface, member, asVariants(arguments)});
+}
+
+void Phone::emitSignal(const QString &service, const QString &path, const QString &interface,
+                       const QString &member, const QVariantList &arguments)
+{
+    sendSignal(service, path, interface, member, arguments);
     settle(service);
 }
 
 void Phone::settle(const QString &service)
 {
-    QDBusPendingCallWatcher watcher(QDBusConnection::systemBus().asyncCall(QDBusMessage::createMethodCall(
-        service, QStringLiteral("/"), QStringLiteral("org.freedesktop.DBus.Peer"), QStringLiteral("Ping"))));
-    bool finished = false;
-    QObject::connect(&watcher, &QDBusPendingCallWatcher::finished, [&finished] { finished = true; });
-    if (!waitUntil([&finished] { return finished; }))
-        qFatal("%s does not answer", qPrintable(service));
+    // The first answer means that all earlier calls are in the service's queue, the second that the queue has
+    // been worked off, and the last that what came of it has arrived here.
+    ping(service);
+    control(QStringLiteral("Services"));
+    ping(service);
 }
 
 QStringList Phone::takeJournal(const QString &service)
@@ -133,6 +138,18 @@ void Phone::act(const QString &action, const QStringList &arguments)
 QJsonObject Phone::state() const
 {
     return QJsonDocument::fromJson(control(QStringLiteral("State")).first().toString().toUtf8()).object();
+}
+
+void Phone::ping(const QString &service) const
+{
+    QDBusPendingCallWatcher watcher(QDBusConnection::systemBus().asyncCall(QDBusMessage::createMethodCall(
+        service, QStringLiteral("/"), QStringLiteral("org.freedesktop.DBus.Peer"), QStringLiteral("Ping"))));
+    // Not isFinished(): that is true as soon as QtDBus's thread has the answer, while the signal comes
+    // through the event loop of this one, after all that arrived before.
+    bool finished = false;
+    QObject::connect(&watcher, &QDBusPendingCallWatcher::finished, [&finished] { finished = true; });
+    if (!waitUntil([&finished] { return finished; }))
+        qFatal("%s does not answer", qPrintable(service));
 }
 
 QVariantList Phone::control(const QString &method, const QVariantList &arguments) const

@@ -32,6 +32,9 @@ public:
     void swallowCalls(const QString &service, const QString &path, const QString &member);
     void clearFaults();
 
+    /** Emits a signal. */
+    void sendSignal(const QString &service, const QString &path, const QString &interface,
+                    const QString &member, const QVariantList &arguments = QVariantList());
     /** Emits a signal and waits until this process has taken it in. */
     void emitSignal(const QString &service, const QString &path, const QString &interface,
                     const QString &member, const QVariantList &arguments = QVariantList());
@@ -51,6 +54,7 @@ public:
     QJsonObject state() const;
 
 private:
+    void ping(const QString &service) const;
     QVariantList control(const QString &method, const QVariantList &arguments = QVariantList()) const;
     void setFault(const QString &service, const QString &path, const QString &member, const QString &kind,
                   const QVariantMap &options);

@@ -1,0 +1,30 @@
+// SPDX-License-Identifier: LGPL-2.1-or-later
+#ifndef CORVANE_COMMANDS_H
+#define CORVANE_COMMANDS_H
+
+#include "command.h"
+#include "timeouts.h"
+
+namespace Corvane
+{
+namespace Agent
+{
+
+// One a family, in a file of its own.
+Command updateCommand();
+Command callsCommand();
+Command policyCommand();
+
+// Options that commands share.
+Option jsonOption();
+Option timeoutOption(const QString &meaning);
+
+bool wantsJson(const Values &values);
+
+/** The timeouts that hold unless the command line says otherwise. */
+Timeouts timeoutsOf(const Values &values);
+
+} // namespace Agent
+} // namespace Corvane
+
+#endif // CORVANE_COMMANDS_H

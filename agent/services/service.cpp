@@ -1,0 +1,59 @@
+// SPDX-License-Identifier: LGPL-2.1-or-later
+#include "service.h"
+
+#include <QtDBus/QDBusConnection>
+#include <QtDBus/QDBusConnectionInterface>
+#include <QtDBus/QDBusReply>
+
+namespace Corvane
+{
+namespace Agent
+{
+
+Service Service::telephony()
+{
+    return {QStringLiteral("org.ofono"), QStringLiteral("telephony service")};
+}
+
+Service Service::mdmProxy()
+{
+    return {QStringLiteral("org.corvaneos.mdmproxy"), QStringLiteral("MDM proxy")};
+}
+
+QString Service::toString() const
+{
+    return QStringLiteral("the %1 (%2)").arg(description, name);
+}
+
+bool Service::isRunning() const
+{
+    const QDBusConnection bus = QDBusConnection::systemBus();
+    return bus.isConnected() && bus.interface()->isServiceRegistered(name);
+}
+
+Reply Service::ensureRunning() const
+{
+    const QDBusConnection bus = QDBusConnection::systemBus();
+    if (!bus.isConnected()) {
+        return {Reply::ServiceLost,
+                QStringLiteral("the system bus cannot be reached: %1").arg(bus.lastError().message())};
+    }
+    if (isRunning())
+        return {};
+    const QStringList activatable = bus.interface()->activatableServiceNames();
+    if (!activatable.contains(name))
+        return notRunning();
+    const QDBusReply<void> started = bus.interface()->startService(name);
+    if (started.isValid())
+        return {};
+    return {Reply::ServiceLost,
+            QStringLiteral("%1 cannot be started: %2").arg(toString(), started.error().message())};
+}
+
+Reply Service::notRunning() const
+{
+    return {Reply::ServiceLost, toString() + QLatin1String(" is not running")};
+}
+
+} // namespace Agent
+} // namespace Corvane

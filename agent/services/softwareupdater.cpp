@@ -1,0 +1,98 @@
+// SPDX-License-Identifier: LGPL-2.1-or-later
+#include "softwareupdater.h"
+
+#include "service.h"
+#include "wait.h"
+#include "warningcapture.h"
+
+namespace Corvane
+{
+namespace Agent
+{
+
+using Mdm::SoftwareUpdate;
+
+namespace
+{
+
+void failWith(Wait *wait, const SoftwareUpdate *updates)
+{
+    QObject::connect(updates, &SoftwareUpdate::softwareUpdateFailed, wait, [wait](const QString &reason) {
+        wait->end(Reply::Refused, QLatin1String("the phone reports: ") + reason);
+    });
+}
+
+} // namespace
+
+SoftwareUpdater::SoftwareUpdater(std::chrono::milliseconds timeout, QObject *parent)
+    : QObject(parent)
+    , m_timeout(timeout)
+{
+    connect(&m_updates, &SoftwareUpdate::softwareUpdateDownloadProgress, this,
+            &SoftwareUpdater::downloadProgress);
+}
+
+SoftwareUpdater::Offer SoftwareUpdater::offer() const
+{
+    Offer offer;
+    const WarningCapture failures(QStringLiteral("^Failed to "), [&](const QString &reason) {
+        offer.reply = {Reply::Refused, reason};
+    });
+    const bool available = m_updates.softwareUpdateIsAvailable();
+    if (offer.reply.isDone() && available)
+        offer.version = m_updates.latestAvailableUpdateVersion();
+    // A service that died under the question explains the failure better than the bus does.
+    if (!offer.reply.isDone() && !Service::mdmProxy().isRunning())
+        offer.reply = Service::mdmProxy().notRunning();
+    return offer;
+}
+
+Reply SoftwareUpdater::check()
+{
+    return perform(QStringLiteral("finish looking for updates"), &SoftwareUpdate::softwareUpdateInfoChanged,
+                   [this] { m_updates.checkForSoftwareUpdate(); });
+}
+
+Reply SoftwareUpdater::download(const QString &version)
+{
+    return perform(QStringLiteral("go on with the download"), &SoftwareUpdate::softwareUpdateDownloaded,
+                   [this, version] { m_updates.downloadSoftwareUpdate(version); });
+}
+
+Reply SoftwareUpdater::install()
+{
+    return perform(QStringLiteral("begin the installation"),
+                   &SoftwareUpdate::softwareUpdateInstallationStarted,
+                   [this] { m_updates.installSoftwareUpdate(); });
+}
+
+Reply SoftwareUpdater::waitUntilInstalled(const QString &version)
+{
+    Wait wait(Service::mdmProxy(), m_timeout, QStringLiteral("finish the installation"));
+    failWith(&wait, &m_updates);
+    wait.until(&m_updates, &SoftwareUpdate::softwareUpdateInfoChanged, [this, version] {
+        const Offer now = offer();
+        return now.reply.isDone() && now.version != version;
+    });
+    return wait.run();
+}
+
+const SoftwareUpdate *SoftwareUpdater::updates() const
+{
+    return &m_updates;
+}
+
+Reply SoftwareUpdater::perform(const QString &awaited, void (SoftwareUpdate::*completion)(),
+                               const std::function<void()> &command)
+{
+    Wait wait(Service::mdmProxy(), m_timeout, awaited);
+    failWith(&wait, &m_updates);
+    connect(&m_updates, completion, &wait, [&wait] { wait.end(Reply::Done); });
+    connect(&m_updates, &SoftwareUpdate::softwareUpdateDownloading, &wait, [&wait] { wait.prolong(); });
+    connect(&m_updates, &SoftwareUpdate::softwareUpdateDownloadProgress, &wait, [&wait] { wait.prolong(); });
+    command();
+    return wait.run();
+}
+
+} // namespace Agent
+} // namespace Corvane

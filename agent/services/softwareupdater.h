@@ -1,0 +1,62 @@
+// SPDX-License-Identifier: LGPL-2.1-or-later
+#ifndef CORVANE_SOFTWAREUPDATER_H
+#define CORVANE_SOFTWAREUPDATER_H
+
+#include "reply.h"
+
+#include <corvanemdm/softwareupdate.h>
+
+#include <QtCore/QObject>
+
+#include <chrono>
+#include <functional>
+
+namespace Corvane
+{
+namespace Agent
+{
+
+/**
+ * Updates of the operating system, with every step awaited until the phone tells of its end.
+ * The time limit is on silence: a phone that reports progress may take as long as it needs.
+ */
+class SoftwareUpdater : public QObject
+{
+    Q_OBJECT
+
+public:
+    /** What the last check found. */
+    struct Offer {
+        Reply reply; ///< whether the phone told
+        QString version; ///< empty: no update is on offer
+    };
+
+    explicit SoftwareUpdater(std::chrono::milliseconds timeout, QObject *parent = nullptr);
+
+    Offer offer() const;
+
+    Reply check();
+    Reply download(const QString &version);
+    /** Waits until the installation has begun. */
+    Reply install();
+    /** Waits until @p version is on offer no more, as it is in place. */
+    Reply waitUntilInstalled(const QString &version);
+
+    /** The library's object, for those that follow its signals. */
+    const Mdm::SoftwareUpdate *updates() const;
+
+Q_SIGNALS:
+    void downloadProgress(int percent);
+
+private:
+    Reply perform(const QString &awaited, void (Mdm::SoftwareUpdate::*completion)(),
+                  const std::function<void()> &command);
+
+    Mdm::SoftwareUpdate m_updates;
+    std::chrono::milliseconds m_timeout;
+};
+
+} // namespace Agent
+} // namespace Corvane
+
+#endif // CORVANE_SOFTWAREUPDATER_H

@@ -1,0 +1,82 @@
+// SPDX-License-Identifier: LGPL-2.1-or-later
+#include "warningcapture.h"
+
+#include <QtCore/QCoreApplication>
+#include <QtCore/QThread>
+
+#include <algorithm>
+#include <cstdio>
+#include <vector>
+
+namespace Corvane
+{
+namespace Agent
+{
+
+namespace
+{
+
+std::vector<const WarningCapture *> captures;
+QByteArray messagePrefix;
+
+bool onMainThread()
+{
+    return !qApp || qApp->thread() == QThread::currentThread();
+}
+
+} // namespace
+
+WarningCapture::WarningCapture(const QString &pattern, std::function<void(const QString &)> taker)
+    : m_pattern(pattern)
+    , m_taker(std::move(taker))
+{
+    captures.push_back(this);
+}
+
+WarningCapture::~WarningCapture()
+{
+    captures.erase(std::remove(captures.begin(), captures.end(), this), captures.end());
+}
+
+void WarningCapture::install(const QByteArray &prefix)
+{
+    messagePrefix = prefix;
+    qInstallMessageHandler(handle);
+}
+
+QString WarningCapture::reasonOf(const QString &warning)
+{
+    static const QRegularExpression nameAndMessage(QStringLiteral(R"re("([^" ]+)",? "(.*)"\)?$)re"));
+    const QRegularExpressionMatch match = nameAndMessage.match(warning);
+    if (!match.hasMatch())
+        return warning;
+    const QString name = match.captured(1);
+    const QString message = match.captured(2);
+    return message.isEmpty() ? name : QStringLiteral("%1 (%2)").arg(message, name);
+}
+
+void WarningCapture::handle(QtMsgType type, const QMessageLogContext &, const QString &message)
+{
+    if (type == QtDebugMsg || type == QtInfoMsg)
+        return;
+    if (onMainThread()) {
+        const auto taken
+            = std::find_if(captures.crbegin(), captures.crend(),
+                           [&](const WarningCapture *capture) { return capture->take(message); });
+        if (taken != captures.crend())
+            return;
+    }
+    const QByteArray line = messagePrefix + "warning: " + message.toLocal8Bit() + '\n';
+    std::fwrite(line.constData(), 1, std::size_t(line.size()), stderr);
+}
+
+bool WarningCapture::take(const QString &message) const
+{
+    if (!m_pattern.match(message).hasMatch())
+        return false;
+    m_taker(reasonOf(message));
+    return true;
+}
+
+} // namespace Agent
+} // namespace Corvane

@@ -1,0 +1,48 @@
+// SPDX-License-Identifier: LGPL-2.1-or-later
+#ifndef CORVANE_TEST_MDMCTL_H
+#define CORVANE_TEST_MDMCTL_H
+
+#include <QtCore/QByteArray>
+#include <QtCore/QJsonObject>
+#include <QtCore/QProcess>
+#include <QtCore/QString>
+#include <QtCore/QStringList>
+#include <QtCore/QVector>
+
+/** mdmctl, as it is run by a person or a script. */
+class Mdmctl
+{
+public:
+    struct Result {
+        int status; ///< -1 when it was killed by a signal
+        QString output;
+        QString errors;
+
+        QJsonObject json() const; ///< all of the output
+        QVector<QJsonObject> jsonLines() const;
+    };
+
+    /** Runs it to its end. */
+    static Result run(const QStringList &arguments, const QByteArray &input = QByteArray());
+
+    /** Starts it. */
+    explicit Mdmctl(const QStringList &arguments);
+    ~Mdmctl();
+
+    /** Waits until it has written @p text to its standard output, @p times times. */
+    bool waitForOutput(const QString &text, int times = 1);
+    /** The same for standard error. */
+    bool waitForErrors(const QString &text);
+
+    void interrupt(int signal);
+    Result finish();
+
+private:
+    Q_DISABLE_COPY(Mdmctl)
+
+    QProcess m_process;
+    QByteArray m_output;
+    QByteArray m_errors;
+};
+
+#endif // CORVANE_TEST_MDMCTL_H

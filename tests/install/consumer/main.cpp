@@ -1,0 +1,52 @@
+// SPDX-License-Identifier: LGPL-2.1-or-later
+// Uses every public class from outside of the project. Where no service answers, it must work as well.
+#include <corvanemdm/corvanemdm_global.h>
+#include <corvanemdm/simfilter.h>
+#include <corvanemdm/simvoicecallfilter.h>
+#include <corvanemdm/softwareupdate.h>
+
+#include <QtCore/QCoreApplication>
+#include <QtCore/QDebug>
+#include <QtCore/QTextStream>
+
+using namespace Corvane::Mdm;
+
+namespace
+{
+
+bool simFilterWorks()
+{
+    const SimFilter::Rule rule(QStringLiteral("244120000000001"), SimFilter::Allow);
+    QString text;
+    QDebug(&text) << rule.action << &rule;
+    return SimFilter::isValidImsi(rule.imsi) && !SimFilter::isValidImsi(QStringLiteral("244x"))
+        && QString(rule) == QLatin1String("Rule (imsi=244120000000001, action=2)")
+        && text.contains(QLatin1String("allow"));
+}
+
+bool simVoiceCallFilterWorks()
+{
+    SimVoiceCallFilter filter;
+    QObject::connect(&filter, &SimVoiceCallFilter::readyChanged, &filter, [] {});
+    // Not ready before the event loop has run, so that no request is a change.
+    return !filter.ready() && filter.dialRules().isEmpty() && !filter.clearIncomingRules();
+}
+
+QString latestVersion()
+{
+    const SoftwareUpdate update;
+    QObject::connect(&update, &SoftwareUpdate::softwareUpdateInfoChanged, &update, [] {});
+    return update.softwareUpdateIsAvailable() ? update.latestAvailableUpdateVersion()
+                                              : QStringLiteral("none");
+}
+
+} // namespace
+
+int main(int argc, char **argv)
+{
+    QCoreApplication application(argc, argv);
+    const bool works = simFilterWorks() && simVoiceCallFilterWorks();
+    QTextStream(stdout) << (works ? "consumer works" : "consumer fails") << ", update: " << latestVersion()
+                        << '\n';
+    return works ? 0 : 1;
+}
