@@ -20,6 +20,7 @@
 #include <map>
 #include <optional>
 #include <poll.h>
+#include <sstream>
 #include <sys/prctl.h>
 #include <sys/signalfd.h>
 #include <sys/wait.h>
@@ -113,6 +114,20 @@ void redirect(const std::string &fileName, int flags, int fd)
         dup2(file, fd);
         close(file);
     }
+}
+
+/** Whether a shell would find @p program, which execvp() does not tell from a folder in PATH that it cannot
+ * enter. */
+bool isFound(const std::string &program)
+{
+    if (program.find('/') != std::string::npos)
+        return access(program.c_str(), F_OK) == 0;
+    std::istringstream folders(std::getenv("PATH"));
+    for (std::string folder; std::getline(folders, folder, ':');) {
+        if (access((folder + "/" + program).c_str(), F_OK) == 0)
+            return true;
+    }
+    return false;
 }
 
 /** A signal that asked for the end before the command could start. */
@@ -277,7 +292,7 @@ void Supervisor::execute(const std::vector<std::string> &command)
         arguments.push_back(const_cast<char *>(argument.c_str()));
     arguments.push_back(nullptr);
     execvp(arguments[0], arguments.data());
-    const int error = errno;
+    const int error = errno == EACCES && !isFound(command.front()) ? ENOENT : errno;
     std::fprintf(stderr, "corvane-simulator: %s: %s\n", arguments[0],
                  error == ENOENT ? "command not found" : std::strerror(error));
     _exit(error == ENOENT ? 127 : 126);
