@@ -22,10 +22,10 @@ using Mdm::SimFilter;
 namespace
 {
 
-constexpr QLatin1String directionArgument("DIR");
-constexpr QLatin1String imsiArgument("IMSI");
-constexpr QLatin1String actionArgument("ACTION");
-constexpr QLatin1String ruleArgument("IMSI=ACTION");
+const QLatin1String directionArgument("DIR");
+const QLatin1String imsiArgument("IMSI");
+const QLatin1String actionArgument("ACTION");
+const QLatin1String ruleArgument("IMSI=ACTION");
 
 CallDirection directionOf(const Values &values)
 {
@@ -274,7 +274,7 @@ Command command(const QString &name, const QString &summary, const QVector<Argum
     return command;
 }
 
-constexpr QLatin1String changeJson(
+const QLatin1String changeJson(
     "JSON, after the change: {\"changed\": true, \"direction\": \"dial\", \"default\": \"allow\",\n"
     "\"rules\": [{\"imsi\": \"244051234567890\", \"action\": \"block\"}]}");
 

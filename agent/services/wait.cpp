@@ -13,7 +13,7 @@ namespace Agent
 namespace
 {
 
-constexpr QLatin1String refusals(R"(^Method call failed: |GetAll\(\) failed: )");
+const QLatin1String refusals(R"(^Method call failed: |GetAll\(\) failed: )");
 
 QString seconds(std::chrono::milliseconds time)
 {
