@@ -16,8 +16,17 @@ namespace Agent
 namespace
 {
 
-std::vector<const WarningCapture *> captures;
-QByteArray messagePrefix;
+std::vector<const WarningCapture *> &captures()
+{
+    static std::vector<const WarningCapture *> all;
+    return all;
+}
+
+QByteArray &messagePrefix()
+{
+    static QByteArray prefix;
+    return prefix;
+}
 
 bool onMainThread()
 {
@@ -30,17 +39,18 @@ WarningCapture::WarningCapture(const QString &pattern, std::function<void(const 
     : m_pattern(pattern)
     , m_taker(std::move(taker))
 {
-    captures.push_back(this);
+    captures().push_back(this);
 }
 
 WarningCapture::~WarningCapture()
 {
-    captures.erase(std::remove(captures.begin(), captures.end(), this), captures.end());
+    auto &all = captures();
+    all.erase(std::remove(all.begin(), all.end(), this), all.end());
 }
 
 void WarningCapture::install(const QByteArray &prefix)
 {
-    messagePrefix = prefix;
+    messagePrefix() = prefix;
     qInstallMessageHandler(handle);
 }
 
@@ -61,12 +71,12 @@ void WarningCapture::handle(QtMsgType type, const QMessageLogContext &, const QS
         return;
     if (onMainThread()) {
         const auto taken
-            = std::find_if(captures.crbegin(), captures.crend(),
+            = std::find_if(captures().crbegin(), captures().crend(),
                            [&](const WarningCapture *capture) { return capture->take(message); });
-        if (taken != captures.crend())
+        if (taken != captures().crend())
             return;
     }
-    const QByteArray line = messagePrefix + "warning: " + message.toLocal8Bit() + '\n';
+    const QByteArray line = messagePrefix() + "warning: " + message.toLocal8Bit() + '\n';
     std::fwrite(line.constData(), 1, std::size_t(line.size()), stderr);
 }
 

@@ -92,6 +92,7 @@ private Q_SLOTS:
     void watchTakesUpAServiceThatComesBack();
     void watchInstallsAnUpdateThatAppears();
     void watchDoesNotRepeatARefusedChange();
+    void watchEndsWithTheBus();
     void examplesAreValid_data();
     void examplesAreValid();
     void schemaIsPrinted();
@@ -226,7 +227,10 @@ void MdmctlPolicyTest::orderOfRulesDoesNotMatter()
 void MdmctlPolicyTest::policyFromStandardInput()
 {
     const QStringList arguments{QStringLiteral("policy"), QStringLiteral("check"), QStringLiteral("-")};
-    QCOMPARE(Mdmctl::run(arguments, R"({"calls": {"dial": {"default": "block"}}})").status, 1);
+    const Mdmctl::Result checked = Mdmctl::run(arguments, R"({"calls": {"dial": {"default": "block"}}})");
+    QVERIFY2(checked.output.endsWith(QStringLiteral("standard input: 1 different.\n")),
+             qPrintable(checked.output));
+    QCOMPARE(checked.status, 1);
     const Mdmctl::Result wrong = Mdmctl::run(arguments, R"({"calls": {"dial": {"default": "hangup"}}})");
     QCOMPARE(
         wrong.errors,
@@ -249,10 +253,10 @@ void MdmctlPolicyTest::wrongPolicyIsRefusedWithThePath_data()
     QTest::newRow("syntax") << QByteArray("{\n\"calls\": ,}") << R"(FILE:2:10: illegal value)";
     QTest::newRow("unknown family")
         << QByteArray(R"({"call": {}})")
-        << R"(FILE: unknown member "call": must be one of "$schema", "calls", "description", "name", "softwareUpdate")";
+        << R"(FILE: /call: unknown member; must be one of "$schema", "calls", "description", "name", "softwareUpdate")";
     QTest::newRow("unknown member")
         << QByteArray(R"({"calls": {"dail": {}}})")
-        << R"(FILE: /calls: unknown member "dail": must be one of "dial", "incoming")";
+        << R"(FILE: /calls/dail: unknown member; must be one of "dial", "incoming")";
     QTest::newRow("action of the other direction")
         << QByteArray(R"({"calls": {"dial": {"rules": [{"imsi": "1", "action": "hangup"}]}}})")
         << R"(FILE: /calls/dial/rules/0/action: must be one of "allow", "block"; is "hangup")";
@@ -615,6 +619,24 @@ void MdmctlPolicyTest::watchDoesNotRepeatARefusedChange()
     QVERIFY(watch.waitForOutput(QStringLiteral("calls.dial.default: changed (from allow to block)\n")));
     watch.interrupt(SIGINT);
     QCOMPARE(watch.finish().status, 0);
+}
+
+void MdmctlPolicyTest::watchEndsWithTheBus()
+{
+    QProcess bus;
+    bus.start(QStringLiteral("dbus-daemon"),
+              {QStringLiteral("--session"), QStringLiteral("--nofork"), QStringLiteral("--print-address")});
+    QVERIFY(bus.waitForReadyRead());
+    qputenv("DBUS_SYSTEM_BUS_ADDRESS", bus.readLine().trimmed());
+    Mdmctl watch({QStringLiteral("policy"), QStringLiteral("watch"),
+                  write(R"({"calls": {"dial": {"default": "block"}}})")});
+    qunsetenv("DBUS_SYSTEM_BUS_ADDRESS");
+    QVERIFY(watch.waitForOutput(QStringLiteral("Watching for drift from ")));
+    bus.kill();
+    QVERIFY(bus.waitForFinished());
+    const Mdmctl::Result watched = watch.finish();
+    QCOMPARE(watched.errors, QStringLiteral("mdmctl: the system bus is gone\n"));
+    QCOMPARE(watched.status, 3);
 }
 
 void MdmctlPolicyTest::examplesAreValid_data()
