@@ -292,7 +292,9 @@ void Supervisor::execute(const std::vector<std::string> &command)
         arguments.push_back(const_cast<char *>(argument.c_str()));
     arguments.push_back(nullptr);
     execvp(arguments[0], arguments.data());
-    const int error = errno == EACCES && !isFound(command.front()) ? ENOENT : errno;
+    int error = errno;
+    if (error == EACCES && !isFound(command.front()))
+        error = ENOENT;
     std::fprintf(stderr, "corvane-simulator: %s: %s\n", arguments[0],
                  error == ENOENT ? "command not found" : std::strerror(error));
     _exit(error == ENOENT ? 127 : 126);
@@ -553,11 +555,8 @@ int runInPhone(const RunSettings &settings)
         sigset_t callersSignals;
         sigprocmask(SIG_BLOCK, &handled, &callersSignals);
 
-        enterNewNamespaces();
         Pipe life;
-        const pid_t phone = fork();
-        if (phone < 0)
-            throw SetUpError::fromErrno("cannot start the phone's first process");
+        const pid_t phone = forkIntoPhone();
         if (phone == 0) {
             dieWithSimulator(life);
             return Supervisor(settings, callersSignals).run();
