@@ -13,6 +13,7 @@ namespace Agent
 // One a family, in a file of its own.
 Command updateCommand();
 Command callsCommand();
+Command simCommand();
 Command policyCommand();
 
 // Options that commands share.

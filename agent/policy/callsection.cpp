@@ -1,7 +1,7 @@
 // SPDX-License-Identifier: LGPL-2.1-or-later
 #include "callsection.h"
 
-#include "wait.h"
+#include <functional>
 
 namespace Corvane
 {
@@ -31,13 +31,13 @@ Setting::Value rulesValue(const SimFilter::RuleList &rules)
     return {rulesToJson(rules), rulesText(rules)};
 }
 
-bool namesEverySim(const QJsonObject &wanted)
+bool namesSim(const QJsonObject &wanted, const std::function<bool(const QString &imsi)> &predicate)
 {
     for (const CallDirection direction : allCallDirections) {
         const SimFilter::RuleList rules
             = rulesFromJson(wantedFor(direction, wanted).value(rulesMember).toArray());
         for (const SimFilter::Rule &rule : rules) {
-            if (rule.imsi == AnySim)
+            if (predicate(rule.imsi))
                 return true;
         }
     }
@@ -102,27 +102,32 @@ Reply CallSection::open(const QJsonObject &wanted)
     if (!opened.isDone())
         return opened;
     connect(m_filter.get(), &CallFilter::changed, this, &CallSection::drifted);
-    return namesEverySim(wanted) ? openSims() : Reply{};
+    const auto isAnySim = [](const QString &imsi) {
+        return imsi == AnySim;
+    };
+    if (!namesSim(wanted, [](const QString &) { return true; }))
+        return {};
+    const Reply told = openSims();
+    m_simsAreTold = told.isDone();
+    // A rule for a named SIM needs no look at the slots.
+    return m_simsAreTold || !namesSim(wanted, isAnySim) ? Reply{} : told;
 }
 
 Reply CallSection::openSims()
 {
-    m_sims = std::make_unique<SimsOfPhone>();
-    Wait wait(service(), m_timeout, QStringLiteral("tell which SIMs are in the phone"));
-    wait.until(m_sims.get(), &SimsOfPhone::changed, [this] { return m_sims->isReady(); });
-    const Reply known = wait.run();
-    if (!known.isDone())
-        return known;
-    if (!m_sims->error().isEmpty())
-        return {Reply::Refused, QStringLiteral("the SIMs of the phone are not known: ") + m_sims->error()};
-    connect(m_sims.get(), &SimsOfPhone::changed, this, &CallSection::drifted);
-    return {};
+    m_sims = std::make_unique<SimCards>(m_timeout);
+    const Reply told = m_sims->ask();
+    if (told.outcome == Reply::Refused)
+        return {Reply::Refused, QStringLiteral("the SIMs of the phone are not known: ") + told.text};
+    connect(m_sims.get(), &SimCards::changed, this, &CallSection::drifted);
+    return told;
 }
 
 void CallSection::close()
 {
     m_filter.reset();
     m_sims.reset();
+    m_simsAreTold = false;
 }
 
 QVector<Setting> CallSection::compare(const QJsonObject &wanted)
@@ -151,14 +156,28 @@ Setting CallSection::compareDefault(Setting setting, CallDirection direction) co
 Setting CallSection::compareRules(Setting setting, CallDirection direction) const
 {
     const SimFilter::RuleList present = m_filter->rules(direction);
-    const SimFilter::RuleList wanted = expandedRules(rulesFromJson(setting.wanted.json.toArray()),
-                                                     m_sims ? m_sims->imsis() : QStringList());
+    const QStringList imsis = m_simsAreTold ? m_sims->imsis() : QStringList();
+    const SimFilter::RuleList wanted = expandedRules(rulesFromJson(setting.wanted.json.toArray()), imsis);
     const RuleDifference difference(present, wanted);
     setting.present = rulesValue(present);
     setting.wanted = rulesValue(wanted);
     setting.status = difference.isEmpty() ? Setting::Compliant : Setting::Different;
-    setting.detail = difference.toString();
+    QStringList details{difference.toString(), absentSimsText(wanted, imsis)};
+    details.removeAll(QString());
+    setting.detail = details.join(QLatin1String("; "));
     return setting;
+}
+
+/** A rule for a SIM that is elsewhere is kept by the phone, and so it is compliant; but it may be a mistake.
+ */
+QString CallSection::absentSimsText(const SimFilter::RuleList &wanted, const QStringList &present) const
+{
+    QStringList notes;
+    for (const SimFilter::Rule &rule : wanted) {
+        if (m_simsAreTold && !present.contains(rule.imsi))
+            notes.append(QStringLiteral("no SIM %1 in the phone").arg(rule.imsi));
+    }
+    return notes.join(QLatin1String("; "));
 }
 
 Reply CallSection::change(const Setting &setting)

@@ -4,7 +4,7 @@
 
 #include "callfilter.h"
 #include "policysection.h"
-#include "simsofphone.h"
+#include "simcards.h"
 
 #include <chrono>
 #include <memory>
@@ -34,12 +34,14 @@ public:
 
 private:
     Reply openSims();
+    QString absentSimsText(const Mdm::SimFilter::RuleList &wanted, const QStringList &present) const;
     Setting compareDefault(Setting setting, CallDirection direction) const;
     Setting compareRules(Setting setting, CallDirection direction) const;
 
     std::chrono::milliseconds m_timeout;
     std::unique_ptr<CallFilter> m_filter;
-    std::unique_ptr<SimsOfPhone> m_sims; // only for a policy with a rule for every SIM
+    std::unique_ptr<SimCards> m_sims; // only for a policy with rules
+    bool m_simsAreTold = false;
 };
 
 } // namespace Agent

@@ -97,7 +97,9 @@ void MdmctlUsageTest::mistakesAreToldInOneLine_data()
     const auto row = [](const char *arguments, const char *message) {
         QTest::newRow(arguments) << QString::fromUtf8(message);
     };
-    row("", R"("mdmctl" needs a command: must be one of "update", "calls", "policy", "completion")");
+    row("",
+        R"("mdmctl" needs a command: must be one of "update", "calls", "sim", "policy", )"
+        R"("completion")");
     row("calls --json",
         R"("mdmctl calls" needs a command: must be one of "show", "add", "remove", "set", "clear", )"
         R"("default", "watch")");
@@ -158,7 +160,8 @@ void MdmctlUsageTest::bashCompletes_data()
         QTest::newRow(line) << QString::fromUtf8(expected);
     };
     // A line that ends with a space has an empty word at the cursor.
-    row("mdmctl ", "update calls policy completion");
+    row("mdmctl ", "update calls sim policy completion");
+    row("mdmctl sim ", "list watch imei imsi iccid numbers");
     row("mdmctl p", "policy");
     row("mdmctl calls ", "show add remove set clear default watch");
     row("mdmctl calls add ", "dial incoming");
