@@ -487,10 +487,9 @@ void ControlTest::tellsTheState()
     const QByteArray json
         = m_client->control(QStringLiteral("State")).arguments().first().toString().toUtf8();
     const QJsonObject state = QJsonDocument::fromJson(json).object();
-    QCOMPARE(
-        state.keys(),
-        (QStringList{QStringLiteral("callFilters"), QStringLiteral("modems"), QStringLiteral("name"),
-                     QStringLiteral("sims"), QStringLiteral("softwareUpdate"), QStringLiteral("telephony")}));
+    QCOMPARE(state.keys(),
+             (QStringList{QStringLiteral("callFilters"), QStringLiteral("modems"), QStringLiteral("name"),
+                          QStringLiteral("sims"), QStringLiteral("softwareUpdate")}));
     QCOMPARE(state.value(QLatin1String("name")).toString(), QStringLiteral("dual-sim"));
 }
 
