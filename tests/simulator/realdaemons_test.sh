@@ -1,7 +1,7 @@
 #!/bin/bash
 # SPDX-License-Identifier: LGPL-2.1-or-later
 # Daemons of the distribution in the phone.
-set -u
+set -euo pipefail
 
 simulator=$1/bin/corvane-simulator
 failures=0
@@ -18,11 +18,13 @@ expect "its log" "$("$simulator" --real ofono -- grep -c 'oFono version' /run/co
 
 # In a phone the daemon can be taken away, by root, without anybody missing it.
 if [[ $EUID -eq 0 ]]; then
-    text=$("$simulator" -- sh -c 'rm /usr/sbin/ofonod && exec "$0" --real ofono true' "$simulator" 2>&1)
-    expect "status without the daemon" $? 125
+    status=0
+    text=$("$simulator" -- sh -c 'rm /usr/sbin/ofonod && exec "$0" --real ofono true' "$simulator" 2>&1) || status=$?
+    expect "status without the daemon" $status 125
     expect "message" "$text" "corvane-simulator: /usr/sbin/ofonod is not there; install Debian's package ofono"
-    text=$("$simulator" -- sh -c 'ln -sf /bin/false /usr/sbin/ofonod && exec "$0" --real ofono true' "$simulator" 2>&1)
-    expect "status with a daemon that ends" $? 125
+    status=0
+    text=$("$simulator" -- sh -c 'ln -sf /bin/false /usr/sbin/ofonod && exec "$0" --real ofono true' "$simulator" 2>&1) || status=$?
+    expect "status with a daemon that ends" $status 125
     expect "message" "$text" "corvane-simulator: /usr/sbin/ofonod ended unexpectedly with status 1"
 fi
 [[ $failures -eq 0 ]]

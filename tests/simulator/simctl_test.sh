@@ -1,7 +1,7 @@
 #!/bin/bash
 # SPDX-License-Identifier: LGPL-2.1-or-later
 # corvane-simctl as a person uses it; run inside the phone.
-set -u
+set -euo pipefail
 
 work=$(mktemp -d)
 trap 'rm -rf "$work"' EXIT
@@ -9,9 +9,8 @@ failures=0
 
 # Runs corvane-simctl; what it writes is compared with PATTERN, an extended regular expression for the whole of it.
 says() { # STATUS PATTERN ARGUMENTS...
-    local text status
-    text=$(corvane-simctl "${@:3}" 2>&1)
-    status=$?
+    local text status=0
+    text=$(corvane-simctl "${@:3}" 2>&1) || status=$?
     if [[ $status -ne $1 || ! $text =~ ^($2)$ ]]; then
         echo "FAIL: corvane-simctl ${*:3}: status $status, \"$text\"; expected $1, \"$2\""
         failures=$((failures + 1))
@@ -19,7 +18,7 @@ says() { # STATUS PATTERN ARGUMENTS...
 }
 
 get_all() {
-    gdbus call --system -d org.ofono -o /mdm/voicecallfilter/dial -m org.corvaneos.ofono.mdm.VoiceCallFilter.GetAll 2>&1
+    gdbus call --system -d org.ofono -o /mdm/voicecallfilter/dial -m org.corvaneos.ofono.mdm.VoiceCallFilter.GetAll 2>&1 || true
 }
 
 says 0 $'org.corvaneos.mdmproxy  running\norg.ofono               running' services
@@ -59,12 +58,13 @@ mkfifo "$work/journal"
 corvane-simctl journal --follow >"$work/journal" &
 follower=$!
 exec 5<"$work/journal"
+line=
 # The call from above comes first; the next one is made once it is there.
-until [[ ${line:-} == *GetAll* ]]; do read -r -t 60 line <&5 || { echo "FAIL: journal --follow"; exit 1; }; done
+until [[ $line == *GetAll* ]]; do read -r -t 60 line <&5 || { echo "FAIL: journal --follow"; exit 1; }; done
 gdbus call --system -d org.ofono -o / -m org.ofono.Manager.GetModems >/dev/null
 until [[ $line == *GetModems* ]]; do read -r -t 60 line <&5 || { echo "FAIL: journal --follow"; exit 1; }; done
 kill $follower
-wait $follower 2>/dev/null
+wait $follower 2>/dev/null || [[ $? -eq 143 ]]
 exec 5<&-
 
 says 0 'sims\[0\].iccid .*' state sims
