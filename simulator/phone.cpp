@@ -8,8 +8,11 @@ namespace Corvane
 namespace Simulator
 {
 
-Sim Phone::cardWithImsi(const QString &imsi)
+Sim Phone::cardWithImsi(const QString &imsi) const
 {
+    const auto known = m_cards.find(imsi);
+    if (known != m_cards.end())
+        return known->second;
     Sim sim;
     sim.imsi = imsi;
     // A card number begins with 89; the rest only has to be as unique as the IMSI.
@@ -33,6 +36,7 @@ Phone::Phone(const QJsonObject &profile)
         const QJsonArray numbers = card.value(QLatin1String("numbers")).toArray();
         for (const QJsonValue &number : numbers)
             sim.numbers << number.toString();
+        m_cards.emplace(sim.imsi, sim);
         sims.push_back(sim);
     }
 }

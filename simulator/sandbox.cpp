@@ -136,21 +136,20 @@ void mountDevices()
     const std::string dev = storage + "/dev";
     makeFolders(dev);
     mountOn(dev, "tmpfs", "phone", MS_NOSUID | MS_NOEXEC, "mode=0755");
-    for (const char *node : {"null", "zero", "full", "random", "urandom", "tty", "ptmx"}) {
+    for (const char *node : {"null", "zero", "full", "random", "urandom", "tty"}) {
         const std::string device = dev + "/" + node;
         writeFile(device, {});
         mountOn(device, nullptr, std::string("/dev/") + node, MS_BIND);
     }
-    // The caller's terminal must stay one inside.
+    // Terminals of its own: the machine's ptmx finds no terminals from another folder. The caller's terminal
+    // stays one.
     makeFolders(dev + "/pts");
-    mountOn(dev + "/pts", nullptr, "/dev/pts", MS_BIND | MS_REC);
+    mountOn(dev + "/pts", "devpts", "phone", MS_NOSUID | MS_NOEXEC, "newinstance,ptmxmode=0666,mode=0620");
     makeFolders(dev + "/shm");
     mountOn(dev + "/shm", "tmpfs", "phone", MS_NOSUID | MS_NODEV, "mode=1777");
     const std::pair<const char *, const char *> links[] = {
-        {"/proc/self/fd", "/fd"},
-        {"/proc/self/fd/0", "/stdin"},
-        {"/proc/self/fd/1", "/stdout"},
-        {"/proc/self/fd/2", "/stderr"},
+        {"/proc/self/fd", "/fd"},       {"/proc/self/fd/0", "/stdin"}, {"/proc/self/fd/1", "/stdout"},
+        {"/proc/self/fd/2", "/stderr"}, {"pts/ptmx", "/ptmx"},
     };
     for (const auto &[target, link] : links) {
         if (symlink(target, (dev + link).c_str()) < 0)

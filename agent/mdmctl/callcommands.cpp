@@ -22,10 +22,10 @@ using Mdm::SimFilter;
 namespace
 {
 
-const QString directionArgument = QStringLiteral("DIR");
-const QString imsiArgument = QStringLiteral("IMSI");
-const QString actionArgument = QStringLiteral("ACTION");
-const QString ruleArgument = QStringLiteral("IMSI=ACTION");
+constexpr QLatin1String directionArgument("DIR");
+constexpr QLatin1String imsiArgument("IMSI");
+constexpr QLatin1String actionArgument("ACTION");
+constexpr QLatin1String ruleArgument("IMSI=ACTION");
 
 CallDirection directionOf(const Values &values)
 {
@@ -274,7 +274,7 @@ Command command(const QString &name, const QString &summary, const QVector<Argum
     return command;
 }
 
-const QString changeJson = QStringLiteral(
+constexpr QLatin1String changeJson(
     "JSON, after the change: {\"changed\": true, \"direction\": \"dial\", \"default\": \"allow\",\n"
     "\"rules\": [{\"imsi\": \"244051234567890\", \"action\": \"block\"}]}");
 

@@ -45,8 +45,6 @@ QMap<QString, SimFilter::Action> byImsi(const SimFilter::RuleList &rules)
 
 } // namespace
 
-const QString AnySim = QStringLiteral("*");
-
 QString directionName(CallDirection direction)
 {
     return direction == CallDirection::Dial ? QStringLiteral("dial") : QStringLiteral("incoming");

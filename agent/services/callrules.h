@@ -32,7 +32,7 @@ QStringList actionNames(CallDirection direction);
 std::optional<Mdm::SimFilter::Action> actionNamed(CallDirection direction, const QString &name);
 
 /** Stands for every SIM of the phone. */
-extern const QString AnySim;
+constexpr QLatin1String AnySim("*");
 
 /** [{"imsi": "244...", "action": "block"}] */
 QJsonArray rulesToJson(const Mdm::SimFilter::RuleList &rules);

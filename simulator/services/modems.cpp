@@ -359,7 +359,7 @@ QString Modems::insertSim(const QStringList &arguments)
         throw Refusal(QStringLiteral("The SIM %1 is in another slot; pull it there first").arg(imsi));
 
     if (imsi != sim.imsi)
-        sim = Phone::cardWithImsi(imsi);
+        sim = m_phone.cardWithImsi(imsi);
     sim.present = true;
     m_modems[index].insertSim();
     return QStringLiteral("The SIM %1 is in slot %2").arg(imsi).arg(index);
