@@ -37,7 +37,8 @@ QString numberFault(const QString &value)
 QDateTime timeFrom(const QString &text)
 {
     // Neither an offset nor a zone reaches the phone, so all times are sent in UTC.
-    return QDateTime::fromString(text, Qt::ISODateWithMs).toUTC();
+    const QDateTime time = QDateTime::fromString(text, Qt::ISODateWithMs);
+    return time.isValid() ? time.toUTC() : QDateTime();
 }
 
 QString timeFault(const QString &value)
@@ -120,10 +121,9 @@ Command callStatisticsCommand()
             QStringLiteral("Give up when the phone has not answered after so many seconds (default: 25)")),
     };
     search.description = QStringLiteral(
-        "A time without a zone is local. What the selectors choose and what the values count is the phone's\n"
-        "matter; the simulated one has 0 all, 1 outgoing, 2 incoming, 3 missed calls as the first, and\n"
-        "0 how many, 1 how many seconds as the second, by day. Searches of others at the same time can\n"
-        "bring their results here.\n\n"
+        "A time without a zone is local. What the selectors choose, and what the values count, is the MDM "
+        "proxy's\n"
+        "matter. A search that somebody else does at the same time can bring its results here.\n\n"
         "Examples:\n"
         "  mdmctl call-statistics search\n"
         "  mdmctl call-statistics search --first 1 --second 1 --from 2026-03-01 --to 2026-04-01\n\n"

@@ -174,6 +174,9 @@ void CallStatisticsTest::searchSendsTheFourValues_data()
         << -1 << std::numeric_limits<int>::max() << start << end
         << arguments(-1, std::numeric_limits<int>::max(), startText, endText);
     QTest::newRow("open") << 0 << 0 << QDateTime() << QDateTime() << arguments(0, 0, open, open);
+    QTest::newRow("open, in UTC") << 0 << 0 << QDateTime(QDate(), QTime(), Qt::UTC) << QDateTime()
+                                  << arguments(0, 0, QStringLiteral("((0, 0, 0), (-1, -1, -1, -1), 1)"),
+                                               open);
     QTest::newRow("open start") << 0 << 0 << QDateTime() << end << arguments(0, 0, open, endText);
     QTest::newRow("open end") << 0 << 0 << start << QDateTime() << arguments(0, 0, startText, open);
     QTest::newRow("local time") << 0 << 0 << QDateTime(QDate(2026, 3, 1), QTime(1, 2, 3)) << end
