@@ -6,11 +6,8 @@
 
 #include <corvanemdm/callstatistics.h>
 
-#include <QtCore/QJsonArray>
 #include <QtCore/QTimeZone>
 #include <QtDBus/QDBusArgument>
-#include <QtDBus/QDBusConnection>
-#include <QtDBus/QDBusMessage>
 #include <QtDBus/QDBusMetaType>
 #include <QtTest/QtTest>
 
@@ -98,12 +95,6 @@ private Q_SLOTS:
     void destructionWithACallPending();
     void deletionInASlot();
     void worksThroughTheMetaObject();
-
-    void simulatedServiceSearchesItsLog_data();
-    void simulatedServiceSearchesItsLog();
-    void simulatedServiceRefusesWhatItDoesNotKnow_data();
-    void simulatedServiceRefusesWhatItDoesNotKnow();
-    void simulatedLogGrows();
 
 private:
     QStringList callsFor(const CallStatistics::Filter &filter);
@@ -429,97 +420,6 @@ void CallStatisticsTest::worksThroughTheMetaObject()
     QVERIFY(QMetaType::type("Corvane::Mdm::CallStatisticsPrivate::StatisticData") != QMetaType::UnknownType);
     QVERIFY(QMetaType::type("QList<Corvane::Mdm::CallStatisticsPrivate::StatisticData>")
             != QMetaType::UnknownType);
-}
-
-void CallStatisticsTest::simulatedServiceSearchesItsLog_data()
-{
-    QTest::addColumn<int>("direction");
-    QTest::addColumn<int>("measure");
-    QTest::addColumn<QDateTime>("start");
-    QTest::addColumn<QDateTime>("end");
-    QTest::addColumn<QString>("results");
-    const QDateTime open;
-    QTest::newRow("how many") << 0 << 0 << open << open
-                              << "2026-03-01T00:00:00Z=3 2026-03-03T00:00:00Z=1 2026-03-05T00:00:00Z=1";
-    QTest::newRow("how long") << 0 << 1 << open << open
-                              << "2026-03-01T00:00:00Z=65 2026-03-03T00:00:00Z=40 2026-03-05T00:00:00Z=7";
-    QTest::newRow("outgoing") << 1 << 0 << open << open
-                              << "2026-03-01T00:00:00Z=1 2026-03-03T00:00:00Z=1 2026-03-05T00:00:00Z=1";
-    QTest::newRow("incoming") << 2 << 1 << open << open << "2026-03-01T00:00:00Z=5";
-    QTest::newRow("missed") << 3 << 0 << open << open << "2026-03-01T00:00:00Z=1";
-    QTest::newRow("missed, how long") << 3 << 1 << open << open << "2026-03-01T00:00:00Z=0";
-    QTest::newRow("from the start on")
-        << 0 << 0 << utc("2026-03-03T00:00:00Z") << open << "2026-03-03T00:00:00Z=1 2026-03-05T00:00:00Z=1";
-    QTest::newRow("before the end") << 0 << 0 << open << utc("2026-03-03T00:00:00Z")
-                                    << "2026-03-01T00:00:00Z=3";
-    QTest::newRow("within") << 0 << 1 << utc("2026-03-01T10:00:00.001Z") << utc("2026-03-03T00:00:00.001Z")
-                            << "2026-03-01T00:00:00Z=5 2026-03-03T00:00:00Z=40";
-    QTest::newRow("local time") << 0 << 0 << utc("2026-03-03T00:00:00Z").toLocalTime()
-                                << utc("2026-03-05T00:00:00Z").toLocalTime() << "2026-03-03T00:00:00Z=1";
-    QTest::newRow("none") << 0 << 0 << utc("2026-03-05T08:00:01Z") << open << "";
-}
-
-void CallStatisticsTest::simulatedServiceSearchesItsLog()
-{
-    QFETCH(int, direction);
-    QFETCH(int, measure);
-    QFETCH(QDateTime, start);
-    QFETCH(QDateTime, end);
-    QFETCH(QString, results);
-    CallStatistics statistics;
-    SignalSequence seen(&statistics);
-    statistics.search({direction, measure, start, end});
-    QVERIFY(seen.waitFor(1));
-    QCOMPARE(seen.take(), QStringList(QStringLiteral("searchFinished(true, [%1])").arg(results)));
-}
-
-void CallStatisticsTest::simulatedServiceRefusesWhatItDoesNotKnow_data()
-{
-    QTest::addColumn<QVariantList>("arguments");
-    const QDateTime later = utc("2026-03-05T00:00:00Z");
-    const QDateTime earlier = utc("2026-03-01T00:00:00Z");
-    QTest::newRow("direction") << QVariantList{4, 0, QDateTime(), QDateTime()};
-    QTest::newRow("negative direction") << QVariantList{-1, 0, QDateTime(), QDateTime()};
-    QTest::newRow("measure") << QVariantList{0, 2, QDateTime(), QDateTime()};
-    QTest::newRow("negative measure") << QVariantList{0, -1, QDateTime(), QDateTime()};
-    QTest::newRow("inverted range") << QVariantList{0, 0, later, earlier};
-    QTest::newRow("empty range") << QVariantList{0, 0, earlier, earlier};
-}
-
-void CallStatisticsTest::simulatedServiceRefusesWhatItDoesNotKnow()
-{
-    QFETCH(QVariantList, arguments);
-    CallStatistics statistics;
-    SignalSequence seen(&statistics);
-    QDBusMessage call = QDBusMessage::createMethodCall(Service, Path, Interface, QStringLiteral("search"));
-    call.setArguments(arguments);
-    const QDBusMessage reply = QDBusConnection::systemBus().call(call);
-    QCOMPARE(reply.type(), QDBusMessage::ReplyMessage);
-    QCOMPARE(reply.arguments(), QVariantList());
-    QVERIFY(seen.waitFor(1));
-    QCOMPARE(seen.take(), texts({"searchFinished(false, [])"}));
-}
-
-void CallStatisticsTest::simulatedLogGrows()
-{
-    m_phone->act(QStringLiteral("call log"), texts({"outgoing", "12", "2026-04-01T09:00:00+03:00"}));
-    m_phone->act(QStringLiteral("call log"), texts({"missed"}));
-    const QJsonArray log = m_phone->state().value(QLatin1String("callLog")).toArray();
-    QCOMPARE(log.size(), 7);
-    QCOMPARE(log.at(5).toObject(),
-             QJsonObject({{QStringLiteral("time"), QStringLiteral("2026-04-01T06:00:00Z")},
-                          {QStringLiteral("direction"), QStringLiteral("outgoing")},
-                          {QStringLiteral("seconds"), 12}}));
-    QCOMPARE(log.at(6)[QLatin1String("direction")].toString(), QStringLiteral("missed"));
-
-    // The phone keeps the log, not the service.
-    m_phone->stopService(Service);
-    m_phone->startService(Service);
-    CallStatistics statistics;
-    SignalSequence seen(&statistics);
-    statistics.search({1, 1, utc("2026-04-01T00:00:00Z"), utc("2026-04-02T00:00:00Z")});
-    QVERIFY(seen.waitFor(1));
-    QCOMPARE(seen.take(), texts({"searchFinished(true, [2026-04-01T00:00:00Z=12])"}));
 }
 
 QTEST_GUILESS_MAIN(CallStatisticsTest)
