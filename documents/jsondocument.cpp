@@ -23,7 +23,7 @@ namespace
 // Far beyond any document that a person writes; keeps a mistaken "/dev/zero" from filling the memory.
 constexpr qint64 largestDocument = 16 * 1024 * 1024;
 
-constexpr QLatin1String standardInput("-");
+const QLatin1String standardInput("-");
 
 JsonDocument failure(const QString &name, const QString &reason)
 {

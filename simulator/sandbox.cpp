@@ -2,6 +2,7 @@
 #include "sandbox.h"
 
 #include <cerrno>
+#include <csignal>
 #include <cstring>
 #include <fcntl.h>
 #include <fstream>
@@ -13,6 +14,7 @@
 #include <sys/prctl.h>
 #include <sys/socket.h>
 #include <sys/stat.h>
+#include <sys/syscall.h>
 #include <system_error>
 #include <unistd.h>
 
@@ -86,15 +88,8 @@ bool inUserNamespace()
     return !(inside == 0 && outside == 0 && count == 0xffffffffUL);
 }
 
-void enterUserNamespace()
+void mapUser(uid_t uid, gid_t gid)
 {
-    const uid_t uid = getuid();
-    const gid_t gid = getgid();
-    if (unshare(CLONE_NEWUSER) < 0) {
-        throw SetUpError::fromErrno("cannot create a user namespace",
-                                    "allow it with the sysctls user.max_user_namespaces and "
-                                    "kernel.unprivileged_userns_clone, or run it as root");
-    }
     // The kernel wants this before an ordinary user may map a group.
     writeFile("/proc/self/setgroups", "deny");
     writeFile("/proc/self/uid_map", "0 " + std::to_string(uid) + " 1");
@@ -210,13 +205,23 @@ SetUpError SetUpError::fromErrno(const std::string &step, const std::string &adv
     return SetUpError(step + ": " + std::strerror(errno) + (advice.empty() ? "" : "; " + advice));
 }
 
-void enterNewNamespaces()
+pid_t forkIntoPhone()
 {
-    if (!hasCapability(CAP_SYS_ADMIN))
-        enterUserNamespace();
-    // Only children go there; the rest of the separation is the child's own.
-    if (unshare(CLONE_NEWPID) < 0)
-        throw SetUpError::fromErrno("cannot create a process namespace");
+    const bool isOrdinaryUser = !hasCapability(CAP_SYS_ADMIN);
+    const uid_t uid = getuid();
+    const gid_t gid = getgid();
+    // Not unshare(): the caller would no longer be able to create threads and processes of its own.
+    const auto pid = pid_t(syscall(SYS_clone, SIGCHLD | CLONE_NEWPID | (isOrdinaryUser ? CLONE_NEWUSER : 0),
+                                   nullptr, nullptr, nullptr, nullptr));
+    if (pid < 0) {
+        throw SetUpError::fromErrno("cannot create namespaces for users and processes",
+                                    isOrdinaryUser ? "allow it with the sysctls user.max_user_namespaces and "
+                                                     "kernel.unprivileged_userns_clone, or run it as root"
+                                                   : "allow it with the sysctl user.max_pid_namespaces");
+    }
+    if (pid == 0 && isOrdinaryUser)
+        mapUser(uid, gid);
+    return pid;
 }
 
 void buildPhone(const std::string &hostName, const PhoneFiles &files)

@@ -22,10 +22,10 @@ using Results = QList<CallStatistics::Result>;
 namespace
 {
 
-constexpr QLatin1String firstName("--first");
-constexpr QLatin1String secondName("--second");
-constexpr QLatin1String fromName("--from");
-constexpr QLatin1String toName("--to");
+const QLatin1String firstName("--first");
+const QLatin1String secondName("--second");
+const QLatin1String fromName("--from");
+const QLatin1String toName("--to");
 
 QString numberFault(const QString &value)
 {

@@ -20,7 +20,7 @@ namespace Agent
 namespace
 {
 
-constexpr QLatin1String jsonName("--json");
+const QLatin1String jsonName("--json");
 
 /** Where the walk along the words ended. */
 struct Found {

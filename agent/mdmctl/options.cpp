@@ -11,8 +11,8 @@ namespace Agent
 namespace
 {
 
-constexpr QLatin1String jsonName("--json");
-constexpr QLatin1String timeoutName("--timeout");
+const QLatin1String jsonName("--json");
+const QLatin1String timeoutName("--timeout");
 
 QString timeoutFault(const QString &value)
 {

@@ -21,7 +21,7 @@ namespace Agent
 namespace
 {
 
-constexpr QLatin1String fileArgument("FILE");
+const QLatin1String fileArgument("FILE");
 
 bool isAsWanted(const Setting &setting)
 {
@@ -183,7 +183,7 @@ Command command(const QString &name, const QString &summary,
     return command;
 }
 
-constexpr QLatin1String reportHelp(
+const QLatin1String reportHelp(
     "JSON: {\"policy\": \"...\", \"compliant\": false, \"settings\": [{\"path\": \"calls.dial.default\",\n"
     "\"status\": \"different\", \"present\": \"allow\", \"wanted\": \"block\", \"detail\": \"\"}]}");
 

@@ -22,10 +22,10 @@ using Mdm::SimFilter;
 namespace
 {
 
-constexpr QLatin1String directionArgument("DIR");
-constexpr QLatin1String imsiArgument("IMSI");
-constexpr QLatin1String actionArgument("ACTION");
-constexpr QLatin1String ruleArgument("IMSI=ACTION");
+const QLatin1String directionArgument("DIR");
+const QLatin1String imsiArgument("IMSI");
+const QLatin1String actionArgument("ACTION");
+const QLatin1String ruleArgument("IMSI=ACTION");
 
 Traffic trafficOf(const RuleFamily &family, const Values &values)
 {

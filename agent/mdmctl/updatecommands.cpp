@@ -19,8 +19,8 @@ using Mdm::SoftwareUpdate;
 namespace
 {
 
-constexpr QLatin1String waitName("--wait");
-constexpr QLatin1String versionName("VERSION");
+const QLatin1String waitName("--wait");
+const QLatin1String versionName("VERSION");
 
 QJsonValue versionJson(const QString &version)
 {

@@ -49,7 +49,7 @@ std::optional<Mdm::SimFilter::Action> actionNamed(Traffic traffic, const QString
 std::optional<Mdm::SimFilter::Action> actionNamed(const QString &name);
 
 /** Stands for every SIM of the phone. */
-constexpr QLatin1String AnySim("*");
+const QLatin1String AnySim("*");
 
 /** [{"imsi": "244...", "action": "block"}] */
 QJsonArray rulesToJson(const Mdm::SimFilter::RuleList &rules);

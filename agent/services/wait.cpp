@@ -13,7 +13,7 @@ namespace Agent
 namespace
 {
 
-constexpr QLatin1String refusals(R"(^Method call failed: |GetAll\(\) failed: |^search\(\) failed: )");
+const QLatin1String refusals(R"(^Method call failed: |GetAll\(\) failed: |^search\(\) failed: )");
 
 QString seconds(std::chrono::milliseconds time)
 {
