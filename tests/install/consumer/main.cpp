@@ -1,7 +1,10 @@
 // SPDX-License-Identifier: LGPL-2.1-or-later
 // Uses every public class from outside of the project. Where no service answers, it must work as well.
+#include <corvanemdm/callstatistics.h>
 #include <corvanemdm/corvanemdm_global.h>
 #include <corvanemdm/simfilter.h>
+#include <corvanemdm/simmobiledatafilter.h>
+#include <corvanemdm/simsmsfilter.h>
 #include <corvanemdm/simvoicecallfilter.h>
 #include <corvanemdm/softwareupdate.h>
 
@@ -32,6 +35,25 @@ bool simVoiceCallFilterWorks()
     return !filter.ready() && filter.dialRules().isEmpty() && !filter.clearIncomingRules();
 }
 
+bool otherFiltersWork()
+{
+    SimSmsFilter texts;
+    QObject::connect(&texts, &SimSmsFilter::readyChanged, &texts, [] {});
+    SimMobileDataFilter data;
+    QObject::connect(&data, &SimMobileDataFilter::readyChanged, &data, [] {});
+    return !texts.ready() && !texts.clearTextRules() && !data.ready() && !data.clearRules();
+}
+
+bool callStatisticsWork()
+{
+    CallStatistics statistics;
+    int answers = 0;
+    QObject::connect(&statistics, &CallStatistics::searchFinished, &statistics,
+                     [&answers](bool, const QList<CallStatistics::Result> &) { ++answers; });
+    statistics.search(CallStatistics::Filter());
+    return answers == 0;
+}
+
 QString latestVersion()
 {
     const SoftwareUpdate update;
@@ -45,7 +67,8 @@ QString latestVersion()
 int main(int argc, char **argv)
 {
     QCoreApplication application(argc, argv);
-    const bool works = simFilterWorks() && simVoiceCallFilterWorks();
+    const bool works
+        = simFilterWorks() && simVoiceCallFilterWorks() && otherFiltersWork() && callStatisticsWork();
     QTextStream(stdout) << (works ? "consumer works" : "consumer fails") << ", update: " << latestVersion()
                         << '\n';
     return works ? 0 : 1;
