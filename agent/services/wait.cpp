@@ -69,6 +69,9 @@ Reply Wait::run()
         end(Reply::ServiceLost, m_service.notRunning().text);
     if (!m_ended)
         m_loop.exec();
+    // The bus refuses in the place of a service that died over the request.
+    if (m_reply.outcome == Reply::Refused && !m_service.isRunning())
+        return m_service.notRunning();
     return m_reply;
 }
 

@@ -5,9 +5,11 @@
 
 #include <corvanemdm/callstatistics.h>
 #include <corvanemdm/simfilter.h>
+#include <corvanemdm/siminfo.h>
 
 using Corvane::Mdm::CallStatistics;
 using Corvane::Mdm::SimFilter;
+using Corvane::Mdm::SimInfo;
 
 namespace
 {
@@ -39,12 +41,30 @@ QString text(int type, const void *value)
         return text(*static_cast<const SimFilter::RuleList *>(value));
     if (type == qMetaTypeId<QList<CallStatistics::Result>>())
         return text(*static_cast<const QList<CallStatistics::Result> *>(value));
+    if (type == qMetaTypeId<SimInfo::SimState>())
+        return simStateText(*static_cast<const SimInfo::SimState *>(value));
     if (type == QMetaType::UnknownType)
         return QStringLiteral("<type unknown to the meta-object system>");
     return QVariant(type, value).toString();
 }
 
 } // namespace
+
+QString simStateText(const SimInfo::SimState &state)
+{
+    QStringList words{state.modemPath};
+    if (state.present)
+        words << QStringLiteral("present");
+    if (state.voiceSim)
+        words << QStringLiteral("voice");
+    if (state.dataSim)
+        words << QStringLiteral("data");
+    if (state.enabled)
+        words << QStringLiteral("enabled");
+    words << QStringLiteral("pin:%1").arg(state.pinRequired)
+          << QStringLiteral("net:%1").arg(state.networkRegistration) << state.imsi;
+    return words.join(QLatin1Char(' ')).trimmed();
+}
 
 SignalSequence::SignalSequence(QObject *object)
 {

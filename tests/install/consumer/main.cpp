@@ -3,6 +3,7 @@
 #include <corvanemdm/callstatistics.h>
 #include <corvanemdm/corvanemdm_global.h>
 #include <corvanemdm/simfilter.h>
+#include <corvanemdm/siminfo.h>
 #include <corvanemdm/simmobiledatafilter.h>
 #include <corvanemdm/simsmsfilter.h>
 #include <corvanemdm/simvoicecallfilter.h>
@@ -25,6 +26,18 @@ bool simFilterWorks()
     return SimFilter::isValidImsi(rule.imsi) && !SimFilter::isValidImsi(QStringLiteral("244x"))
         && QString(rule) == QLatin1String("Rule (imsi=244120000000001, action=2)")
         && text.contains(QLatin1String("allow"));
+}
+
+bool simInfoWorks()
+{
+    const SimInfo info;
+    QObject::connect(&info, &SimInfo::simStateChanged, &info, [](const SimInfo::SimState &) {});
+    const SimInfo::SlotInfo slot(1, QStringLiteral("x"));
+    QString text;
+    QDebug(&text) << SimInfo::UnknownPinState << SimInfo::Roaming << &slot;
+    // Nothing is known before the event loop has run.
+    return !info.available() && info.simSlotStates().isEmpty() && text.contains(QLatin1String("roaming"))
+        && QString(slot) == QLatin1String("Slot(1) = (x)");
 }
 
 bool simVoiceCallFilterWorks()
@@ -67,8 +80,8 @@ QString latestVersion()
 int main(int argc, char **argv)
 {
     QCoreApplication application(argc, argv);
-    const bool works
-        = simFilterWorks() && simVoiceCallFilterWorks() && otherFiltersWork() && callStatisticsWork();
+    const bool works = simFilterWorks() && simVoiceCallFilterWorks() && otherFiltersWork() && simInfoWorks()
+        && callStatisticsWork();
     QTextStream(stdout) << (works ? "consumer works" : "consumer fails") << ", update: " << latestVersion()
                         << '\n';
     return works ? 0 : 1;
