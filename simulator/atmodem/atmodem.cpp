@@ -3,6 +3,9 @@
 
 #include "simcard.h"
 
+#include <algorithm>
+#include <utility>
+
 namespace Corvane
 {
 namespace Simulator
@@ -18,7 +21,7 @@ const QString pukWanted = QStringLiteral("+CME ERROR: 12");
 const QString wrongPassword = QStringLiteral("+CME ERROR: 16");
 const QString notAllowed = QStringLiteral("+CME ERROR: 3");
 const QString noService = QStringLiteral("+CME ERROR: 30");
-const QString error = QStringLiteral("ERROR");
+const QString notUnderstood = QStringLiteral("ERROR");
 
 constexpr int pinAttempts = 3;
 constexpr int pukAttempts = 10;
@@ -109,16 +112,24 @@ QStringList AtModem::answer(const QString &commandLine)
     if (line.isEmpty())
         return {};
     if (!line.startsWith(QLatin1String("AT"), Qt::CaseInsensitive))
-        return {error};
+        return {notUnderstood};
     QStringList lines;
-    const QStringList commands = splitOutsideQuotes(line.mid(2), QLatin1Char(';'));
+    m_isAnswering = true;
+    const QString result = performAll(line.mid(2), lines);
+    m_isAnswering = false;
+    return lines << result << std::exchange(m_announcements, {});
+}
+
+QString AtModem::performAll(const QString &commandLine, QStringList &lines)
+{
+    const QStringList commands = splitOutsideQuotes(commandLine, QLatin1Char(';'));
     for (const QString &command : commands) {
         const QString result = perform(parsed(command), lines);
         // What comes after a command that failed is not carried out.
         if (result != ok)
-            return lines << result;
+            return result;
     }
-    return lines << ok;
+    return ok;
 }
 
 QString AtModem::perform(const Command &command, QStringList &lines)
@@ -335,6 +346,9 @@ QString AtModem::enterPin(const QStringList &arguments)
         m_pin = arguments.at(1);
     m_lock = Unlocked;
     m_attemptsLeft = pinAttempts;
+    // The driver has no way to hear that the card is ready now; it looks again at one that comes anew.
+    announceCard(false);
+    announceCard(true);
     announceRegistration(before);
     return ok;
 }
@@ -355,7 +369,7 @@ void AtModem::cardChanged(const QString &pin)
     m_pin = pin;
     m_lock = pin.isEmpty() ? Unlocked : PinLocked;
     m_attemptsLeft = pinAttempts;
-    announce(QStringLiteral("+USIMSTATE: %1").arg(int(m_sim.present)));
+    announceCard(m_sim.present);
 }
 
 void AtModem::setNetwork(Registration registration)
@@ -377,13 +391,12 @@ void AtModem::setFunction(Function function)
     announceRegistration(before);
 }
 
-void AtModem::announce(const QString &line) const
+void AtModem::announceCard(bool isPresent)
 {
-    if (m_announcer)
-        m_announcer(line);
+    announce(QStringLiteral("+USIMSTATE: %1").arg(int(isPresent)));
 }
 
-void AtModem::announceRegistration(Registration before) const
+void AtModem::announceRegistration(Registration before)
 {
     if (registration() == before)
         return;
@@ -391,6 +404,14 @@ void AtModem::announceRegistration(Registration before) const
         announce(registrationLine(QStringLiteral("+CREG"), m_voiceReporting, false));
     if (m_dataReporting > 0)
         announce(registrationLine(QStringLiteral("+CGREG"), m_dataReporting, false));
+}
+
+void AtModem::announce(const QString &line)
+{
+    if (m_isAnswering)
+        m_announcements << line;
+    else if (m_announcer)
+        m_announcer(line);
 }
 
 } // namespace Simulator

@@ -29,10 +29,10 @@ public:
     /** @p sim is the card of slot number @p slot, which outlives the modem and may change. */
     AtModem(const Sim &sim, std::size_t slot);
 
-    /** The lines of the answer to @p commandLine; the last one is the result. */
+    /** The lines of the answer to @p commandLine: information, the result, and what it leads to unasked. */
     QStringList answer(const QString &commandLine);
 
-    /** @p announcer is given the lines that the modem sends unasked. */
+    /** @p announcer is given the lines that the modem sends unasked while it answers nothing. */
     void setAnnouncer(std::function<void(const QString &line)> announcer)
     {
         m_announcer = std::move(announcer);
@@ -55,6 +55,7 @@ private:
     enum Function { MinimumFunction = 0, FullFunction = 1, RadioOff = 4 };
 
     static Command parsed(const QString &text);
+    QString performAll(const QString &commandLine, QStringList &lines);
     QString perform(const Command &command, QStringList &lines);
     QString performIdentity(const Command &command, QStringList &lines) const;
     QString performCard(const Command &command, QStringList &lines);
@@ -63,8 +64,9 @@ private:
     QString enterPin(const QStringList &arguments);
     QString performRegistration(const Command &command, int &reporting, QStringList &lines) const;
     void setFunction(Function function);
-    void announce(const QString &line) const;
-    void announceRegistration(Registration before) const;
+    void announceCard(bool isPresent);
+    void announceRegistration(Registration before);
+    void announce(const QString &line);
     QString registrationLine(const QString &name, int reporting, bool isQuery) const;
 
     const Sim &m_sim;
@@ -78,6 +80,8 @@ private:
     int m_voiceReporting = 0; ///< of +CREG: 0 none, 1 the state, 2 and the cell
     int m_dataReporting = 0; ///< of +CGREG
     bool m_numericOperator = false;
+    bool m_isAnswering = false;
+    QStringList m_announcements; ///< that wait until the answer is complete
 };
 
 } // namespace Simulator
