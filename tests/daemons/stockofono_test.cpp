@@ -107,12 +107,16 @@ void StockOfonoTest::extensionsAreUnknown_data()
     QTest::addColumn<QByteArray>("path");
     QTest::addColumn<QByteArray>("interface");
     QTest::addColumn<QByteArray>("member");
+    QTest::addColumn<QString>("error");
+    const QString unknownMethod = QStringLiteral("error org.freedesktop.DBus.Error.UnknownMethod");
     for (const char *member : {"GetInterfaceVersion", "GetAvailableModems", "GetIMEI", "GetReady"})
-        QTest::newRow(member) << QByteArray("/") << QByteArray(modemManagerInterface) << QByteArray(member);
-    QTest::newRow("GetCardIdentifier")
-        << QByteArray("/ril_0") << QByteArray(simInfoInterface) << QByteArray("GetCardIdentifier");
+        QTest::newRow(member) << QByteArray("/") << QByteArray(modemManagerInterface) << QByteArray(member)
+                              << unknownMethod;
+    QTest::newRow("GetCardIdentifier") << QByteArray("/ril_0") << QByteArray(simInfoInterface)
+                                       << QByteArray("GetCardIdentifier") << unknownMethod;
     QTest::newRow("GetAll") << QByteArray("/mdm/voicecallfilter/dial")
-                            << QByteArray("org.corvaneos.ofono.mdm.VoiceCallFilter") << QByteArray("GetAll");
+                            << QByteArray("org.corvaneos.ofono.mdm.VoiceCallFilter") << QByteArray("GetAll")
+                            << QStringLiteral("error org.freedesktop.DBus.Error.UnknownObject");
 }
 
 void StockOfonoTest::extensionsAreUnknown()
@@ -120,8 +124,7 @@ void StockOfonoTest::extensionsAreUnknown()
     QFETCH(QByteArray, path);
     QFETCH(QByteArray, interface);
     QFETCH(QByteArray, member);
-    QCOMPARE(answer(path, interface, member),
-             QStringLiteral("error org.freedesktop.DBus.Error.UnknownMethod"));
+    QTEST(answer(path, interface, member), "error");
 }
 
 void StockOfonoTest::simInfoHasNoStates()
@@ -130,14 +133,8 @@ void StockOfonoTest::simInfoHasNoStates()
     SignalSequence seen(&info);
     QVERIFY(seen.waitFor(1));
     QVERIFY(info.available());
-    // Modems come and go; nothing is made of it.
-    m_phone.stopService(QLatin1String(service));
-    m_phone.startService(QLatin1String(service));
-    QVERIFY(seen.waitFor(3));
     m_phone.settle(QLatin1String(service));
-    QCOMPARE(seen.take(),
-             QStringList({QStringLiteral("availableChanged(true)"), QStringLiteral("availableChanged(false)"),
-                          QStringLiteral("availableChanged(true)")}));
+    QCOMPARE(seen.take(), QStringList{QStringLiteral("availableChanged(true)")});
     QVERIFY(info.simSlotStates().isEmpty());
     QTest::ignoreMessage(QtDebugMsg,
                          "Failed to fetch IMEI codes. Wait SimInfo to change available before calling this.");
@@ -145,6 +142,22 @@ void StockOfonoTest::simInfoHasNoStates()
     QVERIFY(info.subscriberIdentities().isEmpty());
     QVERIFY(info.cardIdentifier().isEmpty());
     QVERIFY(info.subscriberNumbers().isEmpty());
+
+    m_phone.stopService(QLatin1String(service));
+    QVERIFY(waitUntil([&] { return !info.available(); }));
+    m_phone.startService(QLatin1String(service));
+    QVERIFY(waitUntil([&] { return info.available(); }));
+    const QStringList availability = seen.take().filter(QStringLiteral("availableChanged"));
+    QCOMPARE(
+        availability,
+        QStringList({QStringLiteral("availableChanged(false)"), QStringLiteral("availableChanged(true)")}));
+    // A modem that oFono removes when it ends has nothing but its path.
+    const QList<SimInfo::SimState> states = info.simSlotStates();
+    for (const SimInfo::SimState &state : states) {
+        SimInfo::SimState nothing;
+        nothing.modemPath = state.modemPath;
+        QVERIFY(state == nothing);
+    }
 }
 
 void StockOfonoTest::voiceCallFilterNeverGetsReady()
@@ -161,7 +174,7 @@ void StockOfonoTest::voiceCallFilterNeverGetsReady()
     warnings << log.takeWarnings();
     QCOMPARE(warnings.size(), 2);
     for (const QString &warning : qAsConst(warnings))
-        QVERIFY2(warning.contains(QLatin1String("org.freedesktop.DBus.Error.UnknownMethod")),
+        QVERIFY2(warning.contains(QLatin1String("org.freedesktop.DBus.Error.UnknownObject")),
                  qPrintable(warning));
     QVERIFY(!filter.ready());
     QVERIFY(!filter.clearDialRules());

@@ -89,7 +89,7 @@ void AtModemTest::answers_data()
     row("AT+CSQ", "+CSQ: 25,99|OK");
     // Number of the card: its file, then its content.
     row("AT+CRSM=192,12258", "+CRSM: 144,0,\"0000000A2FE2040000000001020000\"|OK");
-    row("AT+CRSM=176,12258,0,0,10", "+CRSM: 144,0,\"989853010000002143F5\"|OK");
+    row("AT+CRSM=176,12258,0,0,10", "+CRSM: 144,0,\"985308150000002143F5\"|OK");
     row("AT+CRSM=176,12258,0,8,2", "+CRSM: 144,0,\"43F5\"|OK");
     row("AT+CRSM=176,12258,0,8,3", "+CRSM: 103,0|OK");
     row("AT+CRSM=176,12258,-1,0,3", "+CRSM: 103,0|OK");
