@@ -70,13 +70,16 @@ SimSlots::View SimSlots::view() const
 
 std::string SimSlots::effectiveSim(const std::string &chosen) const
 {
-    if (hasSim(chosen))
-        return chosen;
+    std::string first;
     for (const auto &[path, modem] : modems) {
-        if (isEnabled(path) && !modem.announcedImsi().empty())
-            return modem.announcedImsi();
+        if (!isEnabled(path) || modem.announcedImsi().empty())
+            continue;
+        if (modem.announcedImsi() == chosen)
+            return chosen;
+        if (first.empty())
+            first = modem.announcedImsi();
     }
-    return {};
+    return first;
 }
 
 } // namespace VeldMobile

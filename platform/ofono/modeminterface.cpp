@@ -8,7 +8,7 @@ ModemInterface::ModemInterface(const QString &modemPath, QLatin1String interface
     , m_manager(QOfonoManager::instance())
     , m_object(modemPath, interface, this)
     , m_modem(modemPath, QLatin1String("org.ofono.Modem"), this)
-    , m_isListed(listing == AlwaysListed)
+    , m_listingTells(listing == AlwaysListed)
 {
     m_modem.follow("PropertyChanged", this, SLOT(modemPropertyChanged(QString, QDBusVariant)));
     connect(m_manager.data(), &QOfonoManager::modemAdded, this, [this](const QString &path) {
@@ -34,11 +34,11 @@ void ModemInterface::modemPropertyChanged(const QString &name, const QDBusVarian
 {
     if (name != QLatin1String("Interfaces") || !m_object.isServiceThere())
         return;
-    const bool isListed = value.variant().toStringList().contains(m_interface);
-    if (!isListed && m_isListed) {
+    const bool wasListed = m_isListed;
+    m_isListed = value.variant().toStringList().contains(m_interface);
+    m_listingTells = m_listingTells || m_isListed;
+    if (!m_isListed && m_listingTells)
         Q_EMIT hasGone();
-    } else {
-        m_isListed = m_isListed || isListed;
+    else if (!wasListed)
         Q_EMIT mayHaveCome();
-    }
 }

@@ -28,7 +28,7 @@ public:
     void start();
 
 Q_SIGNALS:
-    /** The interface may have come: ask it. Repeated while the modem changes. */
+    /** The interface may have come: ask it. One that the modem never lists may also have gone. */
     void mayHaveCome();
     void hasGone();
 
@@ -40,7 +40,8 @@ private:
     const QSharedPointer<QOfonoManager> m_manager;
     OfonoObject m_object;
     OfonoObject m_modem;
-    bool m_isListed; // or was, and so tells for certain
+    bool m_listingTells; // the interface has been listed, or always is: without that it is not there
+    bool m_isListed = false;
 };
 
 #endif // CORVANEMDM_PLATFORM_OFONO_MODEMINTERFACE_P_H

@@ -69,10 +69,7 @@ void QOfonoExtSimInfo::Private::follow(const QString &path)
     m_simInfo->object()->follow("SubscriberIdentityChanged", this, SLOT(subscriberIdentityChanged(QString)));
     m_simInfo->object()->follow("ServiceProviderNameChanged", this,
                                 SLOT(serviceProviderNameChanged(QString)));
-    connect(m_simInfo.get(), &ModemInterface::mayHaveCome, this, [this] {
-        if (!state.valid)
-            askForAll();
-    });
+    connect(m_simInfo.get(), &ModemInterface::mayHaveCome, this, &Private::askForAll);
     connect(m_simInfo.get(), &ModemInterface::hasGone, this, [this] {
         m_simInfo->object()->forgetCalls();
         setState(State());
@@ -93,11 +90,13 @@ void QOfonoExtSimInfo::Private::ask(QLatin1String method, Value value)
 {
     using Reply = QDBusPendingReply<QString>;
     m_simInfo->object()->call<Reply>(method, [this, value](const Reply &reply) {
-        if (reply.isError())
+        if (reply.isError()) {
+            setState(State());
             return;
+        }
         State known = state;
         known.*value = reply.value();
-        known.valid = --m_unanswered == 0;
+        known.valid = --m_unanswered == 0 || known.valid;
         setState(known);
     });
 }

@@ -23,6 +23,11 @@ const QString notAllowed = QStringLiteral("+CME ERROR: 3");
 const QString noService = QStringLiteral("+CME ERROR: 30");
 const QString notUnderstood = QStringLiteral("ERROR");
 
+// What a card requires, in oFono's words.
+const QString nothingRequired = QStringLiteral("none");
+const QString pinRequired = QStringLiteral("pin");
+const QString pukRequired = QStringLiteral("puk");
+
 constexpr int pinAttempts = 3;
 constexpr int pukAttempts = 10;
 
@@ -76,11 +81,18 @@ struct AtModem::Command {
     QString argument(int index) const { return arguments.value(index); }
 };
 
-AtModem::AtModem(const Sim &sim, std::size_t slot)
+AtModem::AtModem(Sim &sim, std::size_t slot)
     : m_sim(sim)
     , m_slot(slot)
-    , m_attemptsLeft(pinAttempts)
+    , m_pin(QStringLiteral("1234"))
+    , m_asksForPin(lock() != Unlocked)
+    , m_attemptsLeft(lock() == PukLocked ? pukAttempts : pinAttempts)
 {
+}
+
+AtModem::Lock AtModem::lock() const
+{
+    return m_sim.pin == pinRequired ? PinLocked : m_sim.pin == pukRequired ? PukLocked : Unlocked;
 }
 
 AtModem::Command AtModem::parsed(const QString &text)
@@ -178,17 +190,17 @@ QString AtModem::performCard(const Command &command, QStringList &lines)
         if (!m_sim.present)
             return noCard;
         static const char *const states[] = {"READY", "SIM PIN", "SIM PUK"};
-        lines << QStringLiteral("+CPIN: ") + QLatin1String(states[m_lock]);
+        lines << QStringLiteral("+CPIN: ") + QLatin1String(states[lock()]);
         return ok;
     }
     if (command.is("+CPIN", Command::Set))
         return enterPin(command.arguments);
     if (command.is("+CPINR", Command::Execute)) {
         lines << QStringLiteral("+CPINR: SIM PIN,%1,%2")
-                     .arg(m_lock == PukLocked ? 0 : m_attemptsLeft)
+                     .arg(lock() == PukLocked ? 0 : m_attemptsLeft)
                      .arg(pinAttempts);
         lines << QStringLiteral("+CPINR: SIM PUK,%1,%2")
-                     .arg(m_lock == PukLocked ? m_attemptsLeft : pukAttempts)
+                     .arg(lock() == PukLocked ? m_attemptsLeft : pukAttempts)
                      .arg(pukAttempts);
         return ok;
     }
@@ -200,14 +212,14 @@ QString AtModem::performCard(const Command &command, QStringList &lines)
         // Whether the card asks for its PIN; other locks are open.
         if (command.argument(1) == QLatin1String("2"))
             lines << QStringLiteral("+CLCK: %1")
-                         .arg(int(command.argument(0) == QLatin1String("SC") && !m_pin.isEmpty()));
+                         .arg(int(command.argument(0) == QLatin1String("SC") && m_asksForPin));
         return ok;
     }
     if (command.is("+CIMI", Command::Execute)) {
         if (!m_sim.present)
             return noCard;
-        if (m_lock != Unlocked)
-            return m_lock == PinLocked ? pinWanted : pukWanted;
+        if (lock() != Unlocked)
+            return lock() == PinLocked ? pinWanted : pukWanted;
         lines << m_sim.imsi;
         return ok;
     }
@@ -305,7 +317,7 @@ QString AtModem::accessFile(const QStringList &arguments, QStringList &lines) co
     const int access = arguments.value(0).toInt();
     if (access == GetResponse)
         return answerOfCard(done, file.description(id));
-    if (m_lock != Unlocked && !file.readableWhileLocked)
+    if (lock() != Unlocked && !file.readableWhileLocked)
         return answerOfCard(notPermitted);
     if (access == ReadBinary && file.structure == SimFile::Transparent) {
         const QByteArray &content = file.records.first();
@@ -327,24 +339,24 @@ QString AtModem::enterPin(const QStringList &arguments)
 {
     if (!m_sim.present)
         return noCard;
-    if (m_lock == Unlocked)
+    if (lock() == Unlocked)
         return notAllowed;
     const Registration before = registration();
     // A locked-out card wants its PUK, which is any eight digits, and a new PIN.
     constexpr int pukLength = 8;
-    const bool isRight = m_lock == PukLocked ? arguments.size() == 2 && arguments.first().size() == pukLength
+    const bool isRight = lock() == PukLocked ? arguments.size() == 2 && arguments.first().size() == pukLength
                                              : arguments.value(0) == m_pin;
     if (!isRight) {
         m_attemptsLeft = std::max(m_attemptsLeft - 1, 0);
-        if (m_lock == PinLocked && m_attemptsLeft == 0) {
-            m_lock = PukLocked;
+        if (lock() == PinLocked && m_attemptsLeft == 0) {
+            m_sim.pin = pukRequired;
             m_attemptsLeft = pukAttempts;
         }
         return wrongPassword;
     }
-    if (m_lock == PukLocked)
+    if (lock() == PukLocked)
         m_pin = arguments.at(1);
-    m_lock = Unlocked;
+    m_sim.pin = nothingRequired;
     m_attemptsLeft = pinAttempts;
     // The driver has no way to hear that the card is ready now; it looks again at one that comes anew.
     announceCard(false);
@@ -360,15 +372,14 @@ void AtModem::reset()
     m_dataReporting = 0;
     m_numericOperator = false;
     // Without power the card forgets that it was told its PIN.
-    if (!m_pin.isEmpty() && m_lock == Unlocked)
-        m_lock = PinLocked;
+    if (m_asksForPin && lock() == Unlocked)
+        m_sim.pin = pinRequired;
 }
 
-void AtModem::cardChanged(const QString &pin)
+void AtModem::cardChanged()
 {
-    m_pin = pin;
-    m_lock = pin.isEmpty() ? Unlocked : PinLocked;
-    m_attemptsLeft = pinAttempts;
+    m_asksForPin = lock() != Unlocked;
+    m_attemptsLeft = lock() == PukLocked ? pukAttempts : pinAttempts;
     announceCard(m_sim.present);
 }
 
@@ -381,7 +392,7 @@ void AtModem::setNetwork(Registration registration)
 
 AtModem::Registration AtModem::registration() const
 {
-    return m_function == FullFunction && m_sim.present && m_lock == Unlocked ? m_network : NotRegistered;
+    return m_function == FullFunction && m_sim.present && lock() == Unlocked ? m_network : NotRegistered;
 }
 
 void AtModem::setFunction(Function function)

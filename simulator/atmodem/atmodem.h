@@ -23,11 +23,13 @@ class AtModem
 {
 public:
     /** As +CREG numbers them. */
-    enum Registration { NotRegistered = 0, Home = 1, Searching = 2, Denied = 3, Roaming = 5 };
-    enum Lock { Unlocked, PinLocked, PukLocked };
+    enum Registration { NotRegistered = 0, Home = 1, Searching = 2, Denied = 3, Unknown = 4, Roaming = 5 };
 
-    /** @p sim is the card of slot number @p slot, which outlives the modem and may change. */
-    AtModem(const Sim &sim, std::size_t slot);
+    /**
+     * @p sim is the card of slot number @p slot, which outlives the modem and may change. When it requires a
+     * PIN that is 1234; a PUK is any eight digits.
+     */
+    AtModem(Sim &sim, std::size_t slot);
 
     /** The lines of the answer to @p commandLine: information, the result, and what it leads to unasked. */
     QStringList answer(const QString &commandLine);
@@ -40,20 +42,21 @@ public:
     /** The other end of the line is new: what it has switched on is off again. */
     void reset();
 
-    /** The card was put in or taken out; an inserted one wants @p pin first unless that is empty. */
-    void cardChanged(const QString &pin = QString());
+    /** The card was put in or taken out. */
+    void cardChanged();
     /** What the network answers while the radio is on and the card can be used. */
     void setNetwork(Registration registration);
 
-    Lock lock() const { return m_lock; }
     bool isRadioOn() const { return m_function == FullFunction; }
     /** As the modem tells it now. */
     Registration registration() const;
 
 private:
     struct Command;
+    enum Lock { Unlocked, PinLocked, PukLocked };
     enum Function { MinimumFunction = 0, FullFunction = 1, RadioOff = 4 };
 
+    Lock lock() const;
     static Command parsed(const QString &text);
     QString performAll(const QString &commandLine, QStringList &lines);
     QString perform(const Command &command, QStringList &lines);
@@ -69,13 +72,13 @@ private:
     void announce(const QString &line);
     QString registrationLine(const QString &name, int reporting, bool isQuery) const;
 
-    const Sim &m_sim;
+    Sim &m_sim;
     const std::size_t m_slot;
     std::function<void(const QString &)> m_announcer;
     Function m_function = MinimumFunction;
     Registration m_network = Home;
-    Lock m_lock = Unlocked;
     QString m_pin;
+    bool m_asksForPin = false; ///< each time that the card gets power
     int m_attemptsLeft;
     int m_voiceReporting = 0; ///< of +CREG: 0 none, 1 the state, 2 and the cell
     int m_dataReporting = 0; ///< of +CGREG

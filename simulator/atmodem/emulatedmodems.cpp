@@ -24,7 +24,6 @@ const QLatin1String simInterface("org.ofono.SimManager");
 const QLatin1String registrationInterface("org.ofono.NetworkRegistration");
 
 constexpr char configurationFile[] = "/run/corvane-simulator/phonesim.conf";
-constexpr char defaultPin[] = "1234";
 
 /** The modems are called as on the simulated phone, so that whatever runs there finds them here, too. */
 QString modemName(std::size_t slot)
@@ -48,6 +47,7 @@ const NetworkState networkStates[] = {
     {QLatin1String("registered"), AtModem::Home},
     {QLatin1String("searching"), AtModem::Searching},
     {QLatin1String("denied"), AtModem::Denied},
+    {QLatin1String("unknown"), AtModem::Unknown},
     {QLatin1String("roaming"), AtModem::Roaming},
 };
 
@@ -282,7 +282,6 @@ void EmulatedModems::release()
 
 void EmulatedModems::describe(QJsonObject &state) const
 {
-    static const char *const locks[] = {"none", "pin", "puk"};
     QJsonArray sims;
     QJsonArray modems;
     for (std::size_t slot = 0; slot < m_slots.size(); ++slot) {
@@ -294,7 +293,7 @@ void EmulatedModems::describe(QJsonObject &state) const
             {QStringLiteral("provider"), sim.provider},
             {QStringLiteral("numbers"), QJsonArray::fromStringList(sim.numbers)},
             {QStringLiteral("present"), sim.present},
-            {QStringLiteral("locked"), QLatin1String(locks[modem.lock()])},
+            {QStringLiteral("pin"), sim.pin},
         };
         const AtModem::Registration registration = modem.registration();
         const auto found
@@ -349,13 +348,17 @@ QString EmulatedModems::lockSim(const QStringList &arguments)
     Sim &sim = m_phone.sims[slot];
     if (!sim.present)
         throw Refusal(QStringLiteral("There is no SIM in slot %1").arg(slot));
-    const QString pin = arguments.size() > 1 ? arguments.at(1) : QLatin1String(defaultPin);
-    // oFono asks a card for its lock when it comes, and never again by itself.
+    static const QStringList known{QStringLiteral("none"), QStringLiteral("pin"), QStringLiteral("puk")};
+    const QString &pin = arguments.at(1);
+    if (!known.contains(pin))
+        throw Refusal(QStringLiteral("\"%1\" is none of %2").arg(pin, known.join(QStringLiteral(", "))));
+    // oFono asks a card what it requires when it comes, and never again by itself.
     sim.present = false;
     m_slots[slot]->modem.cardChanged();
     sim.present = true;
-    m_slots[slot]->modem.cardChanged(pin);
-    return QStringLiteral("The SIM %1 came back with PIN %2").arg(sim.imsi, pin);
+    sim.pin = pin;
+    m_slots[slot]->modem.cardChanged();
+    return QStringLiteral("The SIM in slot %1 requires \"%2\"").arg(QString::number(slot), pin);
 }
 
 QString EmulatedModems::setNetwork(const QStringList &arguments)
@@ -396,12 +399,13 @@ std::vector<Action> EmulatedModems::actions()
         {QStringLiteral("sim insert"), QStringLiteral("SLOT [IMSI]"),
          QStringLiteral("puts the SIM back, or another one in its place"), 1, 2,
          bound(&EmulatedModems::insertSim)},
-        {QStringLiteral("sim lock"), QStringLiteral("SLOT [PIN]"),
-         QStringLiteral("puts the SIM in anew, so that it asks for its PIN, 1234 unless given"), 1, 2,
+        {QStringLiteral("sim lock"), QStringLiteral("SLOT none|pin|puk"),
+         QStringLiteral("puts the SIM in anew, so that it requires its PIN, which is 1234, or its PUK"), 2, 2,
          bound(&EmulatedModems::lockSim)},
-        {QStringLiteral("network"), QStringLiteral("SLOT STATE"),
-         QStringLiteral("registers a modem anew: unregistered, registered, searching, denied or roaming"), 2,
-         2, bound(&EmulatedModems::setNetwork)},
+        {QStringLiteral("network"), QStringLiteral("SLOT STATUS"),
+         QStringLiteral("what the network makes of the SIM: unregistered, registered, searching, denied, "
+                        "unknown, roaming"),
+         2, 2, bound(&EmulatedModems::setNetwork)},
         {QStringLiteral("modem trace"), QStringLiteral("on|off"),
          QStringLiteral("prints what oFono and the modems say to each other on standard error"), 1, 1,
          bound(&EmulatedModems::setTrace)},

@@ -32,7 +32,7 @@ public:
 private:
     class BringUp;
     struct Slot {
-        Slot(const Sim &sim, std::size_t number)
+        Slot(Sim &sim, std::size_t number)
             : modem(sim, number)
             , port(modem)
         {

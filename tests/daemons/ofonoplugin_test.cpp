@@ -208,7 +208,7 @@ void OfonoPluginTest::pullingAndInserting()
 
 void OfonoPluginTest::lockedCard()
 {
-    m_phone.act(QStringLiteral("sim lock"), texts({"1", "4711"}));
+    m_phone.act(QStringLiteral("sim lock"), texts({"1", "pin"}));
     const auto isLocked = [] {
         return properties("/ril_1", simInterface).value(QStringLiteral("PinRequired"))
             == QLatin1String("pin");
@@ -222,14 +222,12 @@ void OfonoPluginTest::lockedCard()
     const QString enterPin = QStringLiteral("pin");
     QVERIFY(answer("/ril_1", simInterface, "EnterPin", {enterPin, QStringLiteral("0000")})
                 .startsWith(QLatin1String("error ")));
-    QCOMPARE(answer("/ril_1", simInterface, "EnterPin", {enterPin, QStringLiteral("4711")}), QString());
+    QCOMPARE(answer("/ril_1", simInterface, "EnterPin", {enterPin, QStringLiteral("1234")}), QString());
     QVERIFY(m_signals.waitFor(QStringLiteral("/ril_1 SubscriberIdentityChanged ") + secondImsi));
     QVERIFY(!isLocked());
-    // Without a PIN again.
-    m_phone.act(QStringLiteral("sim pull"), texts({"1"}));
-    QVERIFY(m_signals.waitFor(QStringLiteral("/ril_1 SubscriberIdentityChanged")));
+    // Without a PIN again, also when it gets power anew.
     m_signals.take();
-    m_phone.act(QStringLiteral("sim insert"), texts({"1"}));
+    m_phone.act(QStringLiteral("sim lock"), texts({"1", "none"}));
     QVERIFY(m_signals.waitFor(QStringLiteral("/ril_1 SubscriberIdentityChanged ") + secondImsi));
 }
 
@@ -288,7 +286,8 @@ void OfonoPluginTest::choiceIsKeptOverARestart()
     QVERIFY(m_signals.waitFor(QStringLiteral("/ril_1 SubscriberIdentityChanged ") + secondImsi));
     QCOMPARE(ask("GetReady"), QStringLiteral("true"));
     QCOMPARE(ask("GetDefaultVoiceSim"), secondImsi);
-    QCOMPARE(ask("GetDefaultDataSim"), firstImsi);
+    // The chosen one is in a slot that is not in use.
+    QCOMPARE(ask("GetDefaultDataSim"), secondImsi);
     QCOMPARE(ask("GetEnabledModems"), QStringLiteral("[/ril_1]"));
     QVERIFY(waitForOnline("/ril_0", false));
 
@@ -301,9 +300,11 @@ void OfonoPluginTest::choiceIsKeptOverARestart()
             < told.indexOf(QStringLiteral("/ PresentSimsChanged 0 true")));
     QCOMPARE(told.count(QStringLiteral("/ ReadyChanged true")), 1);
 
+    QCOMPARE(set("SetEnabledModems", objectPaths(texts({"/ril_0", "/ril_1"}))), QString());
+    QCOMPARE(ask("GetDefaultVoiceSim"), secondImsi);
+    QCOMPARE(ask("GetDefaultDataSim"), firstImsi);
     QCOMPARE(set("SetDefaultVoiceSim", QString()), QString());
     QCOMPARE(set("SetDefaultDataSim", QString()), QString());
-    QCOMPARE(set("SetEnabledModems", objectPaths(texts({"/ril_0", "/ril_1"}))), QString());
     QVERIFY(waitForOnline("/ril_0", true));
 }
 

@@ -10,6 +10,7 @@
 #include <ofono/qofonomanager.h>
 #include <ofono/qofonosimmanager.h>
 
+#include <QtDBus/QDBusVariant>
 #include <QtTest/QtTest>
 
 #include <memory>
@@ -199,13 +200,13 @@ void RealSimInfoTest::lockedSim()
 {
     QOfonoSimManager sim;
     sim.setModemPath(QStringLiteral("/ril_1"));
-    m_phone.act(QStringLiteral("sim lock"), texts({"1", "4711"}));
+    m_phone.act(QStringLiteral("sim lock"), texts({"1", "pin"}));
     QVERIFY(waitUntil([&] { return sim.pinRequired() == QOfonoSimManager::SimPin; }));
     QVERIFY(sim.present());
     QVERIFY(sim.subscriberIdentity().isEmpty());
     // oFono has no registration for a modem whose SIM is locked: nothing is known of the slot.
     QVERIFY(waitForSlot(1, [](const SimInfo::SimState &state) { return !state.present; }));
-    QCOMPARE(call("/ril_1", simInterface, "EnterPin", {QStringLiteral("pin"), QStringLiteral("4711")}).type(),
+    QCOMPARE(call("/ril_1", simInterface, "EnterPin", {QStringLiteral("pin"), QStringLiteral("1234")}).type(),
              QDBusMessage::ReplyMessage);
     QVERIFY(waitUntil([&] { return sim.pinRequired() == QOfonoSimManager::NoPin; }));
     QVERIFY(waitForCompleteStates());

@@ -4,8 +4,10 @@
 #include "waiting.h"
 
 #include <corvanemdm/simfilter.h>
+#include <corvanemdm/siminfo.h>
 
 using Corvane::Mdm::SimFilter;
+using Corvane::Mdm::SimInfo;
 
 namespace
 {
@@ -26,12 +28,30 @@ QString text(int type, const void *value)
             rules.append(text(rule));
         return QLatin1Char('[') + rules.join(QLatin1Char(' ')) + QLatin1Char(']');
     }
+    if (type == qMetaTypeId<SimInfo::SimState>())
+        return simStateText(*static_cast<const SimInfo::SimState *>(value));
     if (type == QMetaType::UnknownType)
         return QStringLiteral("<type unknown to the meta-object system>");
     return QVariant(type, value).toString();
 }
 
 } // namespace
+
+QString simStateText(const SimInfo::SimState &state)
+{
+    QStringList words{state.modemPath};
+    if (state.present)
+        words << QStringLiteral("present");
+    if (state.voiceSim)
+        words << QStringLiteral("voice");
+    if (state.dataSim)
+        words << QStringLiteral("data");
+    if (state.enabled)
+        words << QStringLiteral("enabled");
+    words << QStringLiteral("pin:%1").arg(state.pinRequired)
+          << QStringLiteral("net:%1").arg(state.networkRegistration) << state.imsi;
+    return words.join(QLatin1Char(' ')).trimmed();
+}
 
 SignalSequence::SignalSequence(QObject *object)
 {

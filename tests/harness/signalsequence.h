@@ -2,14 +2,20 @@
 #ifndef CORVANE_TEST_SIGNALSEQUENCE_H
 #define CORVANE_TEST_SIGNALSEQUENCE_H
 
+#include <corvanemdm/siminfo.h>
+
 #include <QtCore/QMetaMethod>
 #include <QtCore/QObject>
 #include <QtCore/QStringList>
 #include <QtCore/QVector>
 
+/** What comparisons look at, such as "/ril_0 present voice data enabled pin:0 net:1 244051234567890". */
+QString simStateText(const Corvane::Mdm::SimInfo::SimState &state);
+
 /**
  * Records every signal that the class of an object declares, in the order of emission and with its arguments,
- * as "name(argument, argument)". Rules read "244:block", lists of rules "[244:block 262:allow]".
+ * as "name(argument, argument)". Rules read "244:block", lists of rules "[244:block 262:allow]",
+ * SIM states as simStateText() writes them.
  *
  * Connects through the meta-object alone, as a binding to another language would.
  */

@@ -38,6 +38,7 @@ private:
     QString ask(AtModem &modem, const char *line) { return joined(modem.answer(QString::fromUtf8(line))); }
 
 private Q_SLOTS:
+    void init() { m_sim = card(); }
     void answers_data();
     void answers();
     void answersWithoutCard_data();
@@ -174,9 +175,10 @@ void AtModemTest::pin()
     QStringList announced;
     AtModem modem(m_sim, 0);
     modem.setAnnouncer([&](const QString &line) { announced << line; });
-    modem.cardChanged(QStringLiteral("1234"));
+    m_sim.pin = QStringLiteral("pin");
+    modem.cardChanged();
     QCOMPARE(joined(announced), QStringLiteral("+USIMSTATE: 1"));
-    QCOMPARE(modem.lock(), AtModem::PinLocked);
+    QCOMPARE(m_sim.pin, QStringLiteral("pin"));
     QCOMPARE(ask(modem, "AT+CPIN?"), QStringLiteral("+CPIN: SIM PIN|OK"));
     QCOMPARE(ask(modem, "AT+CLCK=\"SC\",2"), QStringLiteral("+CLCK: 1|OK"));
     QCOMPARE(ask(modem, "AT+CIMI"), QStringLiteral("+CME ERROR: 11"));
@@ -190,16 +192,17 @@ void AtModemTest::pin()
     QCOMPARE(ask(modem, "AT+CIMI"), QStringLiteral("244051234567890|OK"));
     // Without power the card forgets that it was told.
     modem.reset();
-    QCOMPARE(modem.lock(), AtModem::PinLocked);
+    QCOMPARE(m_sim.pin, QStringLiteral("pin"));
 }
 
 void AtModemTest::puk()
 {
     AtModem modem(m_sim, 0);
-    modem.cardChanged(QStringLiteral("1234"));
+    m_sim.pin = QStringLiteral("pin");
+    modem.cardChanged();
     for (int i = 0; i < 3; ++i)
         QCOMPARE(ask(modem, "AT+CPIN=\"0\""), QStringLiteral("+CME ERROR: 16"));
-    QCOMPARE(modem.lock(), AtModem::PukLocked);
+    QCOMPARE(m_sim.pin, QStringLiteral("puk"));
     QCOMPARE(ask(modem, "AT+CPIN?"), QStringLiteral("+CPIN: SIM PUK|OK"));
     QCOMPARE(ask(modem, "AT+CIMI"), QStringLiteral("+CME ERROR: 12"));
     QCOMPARE(ask(modem, "AT+CPIN=\"1234\""), QStringLiteral("+CME ERROR: 16"));
@@ -219,7 +222,7 @@ void AtModemTest::newClientFindsEverythingOff()
     modem.setNetwork(AtModem::Roaming);
     QCOMPARE(joined(announced), QString());
     QCOMPARE(ask(modem, "AT+CFUN?;+CREG?"), QStringLiteral("+CFUN: 0|+CREG: 0,0|OK"));
-    QCOMPARE(modem.lock(), AtModem::Unlocked);
+    QCOMPARE(m_sim.pin, QStringLiteral("none"));
 }
 
 void AtModemTest::providerNames_data()

@@ -64,7 +64,7 @@ void SimSlotsTest::defaultSim_data()
     QTest::newRow("chosen") << QByteArray("333") << QByteArray() << QByteArray("333");
     QTest::newRow("chosen is away") << QByteArray("444") << QByteArray() << QByteArray("222");
     QTest::newRow("first is disabled") << QByteArray() << QByteArray("/a_9") << QByteArray("333");
-    QTest::newRow("chosen is disabled") << QByteArray("222") << QByteArray("/a_9") << QByteArray("222");
+    QTest::newRow("chosen is disabled") << QByteArray("222") << QByteArray("/a_9") << QByteArray("333");
 }
 
 void SimSlotsTest::defaultSim()
