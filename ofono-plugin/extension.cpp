@@ -509,10 +509,13 @@ void Extension::setOnline(const std::string &path, bool online)
         throw std::bad_alloc();
     ask(
         path, OFONO_MODEM_INTERFACE, setProperty,
-        [path, online](DBusMessage *answer) {
+        [this, path, online](DBusMessage *answer) {
             if (isError(answer))
                 ofono_warn("Cannot take the modem %s %s: %s", path.c_str(), online ? "online" : "offline",
                            dbus_message_get_error_name(answer));
+            // It was enabled again while it was busy, and refused to go online then.
+            if (!online && m_slots.find(path) && m_slots.isEnabled(path))
+                setOnline(path, true);
         },
         std::move(call));
 }

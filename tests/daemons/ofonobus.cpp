@@ -8,6 +8,7 @@
 #include <QtDBus/QDBusMetaType>
 #include <QtDBus/QDBusObjectPath>
 #include <QtDBus/QDBusPendingCallWatcher>
+#include <QtDBus/QDBusVariant>
 
 #include <utility>
 
@@ -19,6 +20,8 @@ QString toText(const QVariant &value)
     QStringList parts;
     if (value.userType() == qMetaTypeId<QDBusObjectPath>())
         return value.value<QDBusObjectPath>().path();
+    if (value.userType() == qMetaTypeId<QDBusVariant>())
+        return toText(value.value<QDBusVariant>().variant());
     if (value.userType() == QMetaType::QStringList) {
         parts = value.toStringList();
     } else if (value.userType() == qMetaTypeId<QDBusArgument>()) {

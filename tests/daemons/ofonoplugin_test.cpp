@@ -78,6 +78,7 @@ private Q_SLOTS:
     void pullingAndInserting();
     void lockedCard();
     void disabledModems();
+    void modemThatIsEnabledAtOnceAgain();
     void modemWithoutPower();
     void choiceIsKeptOverARestart();
     void choiceThatCannotBeStoredIsNotMade();
@@ -256,6 +257,15 @@ void OfonoPluginTest::disabledModems()
                     "/ DefaultVoiceSimChanged", "/ DefaultDataSimChanged",
                     "/ EnabledModemsChanged [/ril_0 /ril_1]", "/ DefaultVoiceSimChanged 244051234567890",
                     "/ DefaultDataSimChanged 244051234567890"}));
+}
+
+void OfonoPluginTest::modemThatIsEnabledAtOnceAgain()
+{
+    OfonoSignals modemSignals(texts({modemInterface}));
+    QCOMPARE(set("SetEnabledModems", objectPaths(texts({"/ril_0"}))), QString());
+    QCOMPARE(set("SetEnabledModems", objectPaths(texts({"/ril_0", "/ril_1"}))), QString());
+    QVERIFY(modemSignals.waitFor(QStringLiteral("/ril_1 PropertyChanged Online false")));
+    QVERIFY(modemSignals.waitFor(QStringLiteral("/ril_1 PropertyChanged Online true")));
 }
 
 void OfonoPluginTest::modemWithoutPower()

@@ -210,6 +210,9 @@ void RealSimInfoTest::lockedSim()
              QDBusMessage::ReplyMessage);
     QVERIFY(waitUntil([&] { return sim.pinRequired() == QOfonoSimManager::NoPin; }));
     QVERIFY(waitForCompleteStates());
+    // Or it would ask again whenever it gets power.
+    m_phone.act(QStringLiteral("sim lock"), texts({"1", "none"}));
+    QVERIFY(waitForSlot(1, [](const SimInfo::SimState &state) { return !state.present; }));
 }
 
 void RealSimInfoTest::modemWithoutPower()
