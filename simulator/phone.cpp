@@ -3,6 +3,9 @@
 
 #include <QtCore/QJsonArray>
 
+#include <algorithm>
+#include <utility>
+
 namespace Corvane
 {
 namespace Simulator
@@ -43,6 +46,19 @@ Phone::Phone(const QJsonObject &profile)
             sim.numbers << number.toString();
         sims.push_back(sim);
     }
+}
+
+void Phone::replaceSim(std::size_t slot, const QString &imsi)
+{
+    const auto known
+        = std::find_if(drawer.begin(), drawer.end(), [&](const Sim &card) { return card.imsi == imsi; });
+    Sim card = cardWithImsi(imsi);
+    if (known != drawer.end()) {
+        card = *known;
+        drawer.erase(known);
+    }
+    drawer.push_back(std::exchange(sims.at(slot), card));
+    sims.at(slot).present = true;
 }
 
 std::optional<std::size_t> Phone::slotNumbered(const QString &text) const

@@ -36,11 +36,14 @@ public:
 
     /** The card that comes with @p imsi when nothing more is known of it. */
     static Sim cardWithImsi(const QString &imsi);
+    /** Puts the card with @p imsi, out of the drawer or a new one, in the place of the one in @p slot. */
+    void replaceSim(std::size_t slot, const QString &imsi);
 
     /** The slot that @p text is the number of; empty when there is no such slot. */
     std::optional<std::size_t> slotNumbered(const QString &text) const;
 
     std::vector<Sim> sims; ///< by slot
+    std::vector<Sim> drawer; ///< cards that another one has taken the slot of
 };
 
 } // namespace Simulator

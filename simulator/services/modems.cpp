@@ -207,7 +207,7 @@ QString Modems::insertSim(const QStringList &arguments)
         throw Refusal(QStringLiteral("The SIM %1 is in another slot; pull it there first").arg(imsi));
 
     if (imsi != sim.imsi)
-        sim = Phone::cardWithImsi(imsi);
+        m_phone.replaceSim(index, imsi);
     sim.present = true;
     announce();
     return QStringLiteral("The SIM %1 is in slot %2").arg(imsi).arg(index);
