@@ -241,6 +241,7 @@ void EmulatedModems::BringUp::conclude(std::size_t slot, const QString &missing)
 
 EmulatedModems::EmulatedModems(Phone &phone)
     : m_phone(phone)
+    , m_tray(phone, [this](std::size_t slot) { m_slots[slot]->modem.cardChanged(); })
 {
     for (std::size_t slot = 0; slot < phone.sims.size(); ++slot)
         m_slots.push_back(std::make_unique<Slot>(phone.sims[slot], slot));
@@ -282,19 +283,9 @@ void EmulatedModems::release()
 
 void EmulatedModems::describe(QJsonObject &state) const
 {
-    QJsonArray sims;
     QJsonArray modems;
     for (std::size_t slot = 0; slot < m_slots.size(); ++slot) {
-        const Sim &sim = m_phone.sims[slot];
         const AtModem &modem = m_slots[slot]->modem;
-        sims << QJsonObject{
-            {QStringLiteral("imsi"), sim.imsi},
-            {QStringLiteral("iccid"), sim.iccid},
-            {QStringLiteral("provider"), sim.provider},
-            {QStringLiteral("numbers"), QJsonArray::fromStringList(sim.numbers)},
-            {QStringLiteral("present"), sim.present},
-            {QStringLiteral("pin"), sim.pin},
-        };
         const AtModem::Registration registration = modem.registration();
         const auto found
             = std::find_if(std::begin(networkStates), std::end(networkStates),
@@ -305,49 +296,14 @@ void EmulatedModems::describe(QJsonObject &state) const
             {QStringLiteral("registration"), found->name},
         };
     }
-    state.insert(QStringLiteral("sims"), sims);
+    state.insert(QStringLiteral("sims"), m_tray.describe());
     state.insert(QStringLiteral("modems"), modems);
-}
-
-std::size_t EmulatedModems::slotNumber(const QString &text) const
-{
-    if (const std::optional<std::size_t> slot = m_phone.slotNumbered(text))
-        return *slot;
-    throw Refusal(QStringLiteral("There is no SIM slot \"%1\"; the phone has %2, numbered from 0")
-                      .arg(text)
-                      .arg(m_phone.sims.size()));
-}
-
-QString EmulatedModems::pullSim(const QStringList &arguments)
-{
-    const std::size_t slot = slotNumber(arguments.first());
-    Sim &sim = m_phone.sims[slot];
-    if (!sim.present)
-        throw Refusal(QStringLiteral("There is no SIM in slot %1").arg(slot));
-    sim.present = false;
-    m_slots[slot]->modem.cardChanged();
-    return QStringLiteral("The SIM %1 is out of slot %2").arg(sim.imsi).arg(slot);
-}
-
-QString EmulatedModems::insertSim(const QStringList &arguments)
-{
-    const std::size_t slot = slotNumber(arguments.first());
-    Sim &sim = m_phone.sims[slot];
-    if (sim.present)
-        throw Refusal(QStringLiteral("There is a SIM in slot %1; pull it first").arg(slot));
-    if (arguments.size() > 1)
-        sim = Phone::cardWithImsi(arguments.at(1));
-    sim.present = true;
-    m_slots[slot]->modem.cardChanged();
-    return QStringLiteral("The SIM %1 is in slot %2").arg(sim.imsi).arg(slot);
 }
 
 QString EmulatedModems::lockSim(const QStringList &arguments)
 {
-    const std::size_t slot = slotNumber(arguments.first());
-    Sim &sim = m_phone.sims[slot];
-    if (!sim.present)
-        throw Refusal(QStringLiteral("There is no SIM in slot %1").arg(slot));
+    const std::size_t slot = m_tray.slot(arguments.first());
+    Sim &sim = m_tray.card(slot);
     static const QStringList known{QStringLiteral("none"), QStringLiteral("pin"), QStringLiteral("puk")};
     const QString &pin = arguments.at(1);
     if (!known.contains(pin))
@@ -363,7 +319,7 @@ QString EmulatedModems::lockSim(const QStringList &arguments)
 
 QString EmulatedModems::setNetwork(const QStringList &arguments)
 {
-    const std::size_t slot = slotNumber(arguments.first());
+    const std::size_t slot = m_tray.slot(arguments.first());
     QStringList known;
     for (const NetworkState &state : networkStates) {
         if (arguments.at(1) == state.name) {
@@ -393,12 +349,8 @@ std::vector<Action> EmulatedModems::actions()
             return (this->*action)(arguments);
         };
     };
-    return {
-        {QStringLiteral("sim pull"), QStringLiteral("SLOT"), QStringLiteral("takes the SIM out of a slot"), 1,
-         1, bound(&EmulatedModems::pullSim)},
-        {QStringLiteral("sim insert"), QStringLiteral("SLOT [IMSI]"),
-         QStringLiteral("puts the SIM back, or another one in its place"), 1, 2,
-         bound(&EmulatedModems::insertSim)},
+    std::vector<Action> actions = m_tray.actions();
+    const std::vector<Action> own{
         {QStringLiteral("sim lock"), QStringLiteral("SLOT none|pin|puk"),
          QStringLiteral("puts the SIM in anew, so that it requires its PIN, which is 1234, or its PUK"), 2, 2,
          bound(&EmulatedModems::lockSim)},
@@ -410,6 +362,8 @@ std::vector<Action> EmulatedModems::actions()
          QStringLiteral("prints what oFono and the modems say to each other on standard error"), 1, 1,
          bound(&EmulatedModems::setTrace)},
     };
+    actions.insert(actions.end(), own.begin(), own.end());
+    return actions;
 }
 
 } // namespace Simulator

@@ -6,6 +6,7 @@
 #include "atport.h"
 #include "busconnection.h"
 #include "daemonhardware.h"
+#include "simtray.h"
 
 #include <memory>
 #include <vector>
@@ -41,14 +42,12 @@ private:
         AtPort port;
     };
 
-    std::size_t slotNumber(const QString &text) const;
-    QString pullSim(const QStringList &arguments);
-    QString insertSim(const QStringList &arguments);
     QString lockSim(const QStringList &arguments);
     QString setNetwork(const QStringList &arguments);
     QString setTrace(const QStringList &arguments);
 
     Phone &m_phone;
+    const SimTray m_tray;
     std::vector<std::unique_ptr<Slot>> m_slots;
     std::unique_ptr<BringUp> m_bringUp;
 };
