@@ -32,9 +32,10 @@ add_compile_definitions(QT_NO_CAST_FROM_ASCII QT_NO_CAST_TO_ASCII QT_NO_KEYWORDS
 add_link_options(-Wl,--as-needed)
 
 if(CORVANEMDM_SANITIZE)
-    # GCC sees uninitialised values in the standard library once it is instrumented; the plain build looks for them.
-    add_compile_options(-fsanitize=address,undefined -fno-sanitize-recover=all -fno-omit-frame-pointer
-                        -Wno-maybe-uninitialized)
+    # -O1 and line numbers alone: a third of the time to compile, and stacks that are easier to read.
+    add_compile_options(-fsanitize=address,undefined -fno-sanitize-recover=all -fno-omit-frame-pointer -O1 -g1)
+    # Instrumented, the standard library looks uninitialised to GCC; the plain build has the warning on.
+    add_compile_options(-Wno-maybe-uninitialized)
     add_link_options(-fsanitize=address,undefined)
 else()
     add_link_options(-Wl,--no-undefined)

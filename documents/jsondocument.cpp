@@ -23,6 +23,8 @@ namespace
 // Far beyond any document that a person writes; keeps a mistaken "/dev/zero" from filling the memory.
 constexpr qint64 largestDocument = 16 * 1024 * 1024;
 
+const QLatin1String standardInput("-");
+
 JsonDocument failure(const QString &name, const QString &reason)
 {
     return {{}, QStringLiteral("%1: %2").arg(name, reason)};
@@ -86,13 +88,17 @@ JsonDocument parse(const QString &name, const QByteArray &text, const QByteArray
 
 } // namespace
 
+QString documentName(const QString &fileName)
+{
+    return fileName == standardInput ? QStringLiteral("standard input") : fileName;
+}
+
 JsonDocument readJsonDocument(const QString &fileName, const QByteArray &schema)
 {
-    const bool standardInput = fileName == QLatin1String("-");
-    const QString name = standardInput ? QStringLiteral("standard input") : fileName;
+    const QString name = documentName(fileName);
     QFile file(fileName);
     const bool opened
-        = standardInput ? file.open(stdin, QIODevice::ReadOnly) : file.open(QIODevice::ReadOnly);
+        = fileName == standardInput ? file.open(stdin, QIODevice::ReadOnly) : file.open(QIODevice::ReadOnly);
     if (!opened)
         return failure(name, QStringLiteral("cannot be read: %1").arg(file.errorString()));
     const QByteArray text = file.read(largestDocument + 1);

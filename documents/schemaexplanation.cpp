@@ -63,17 +63,17 @@ QString found(const QJsonValue &value)
     return QLatin1String("is ") + written(value);
 }
 
+/** The first member of @p object that @p node does not allow; null when there is none. */
 QString unknownMember(const QJsonObject &node, const QJsonObject &object)
 {
     const QJsonValue additional = node.value(QLatin1String("additionalProperties"));
     if (!additional.isBool() || additional.toBool())
         return QString();
-    const QStringList allowed = node.value(QLatin1String("properties")).toObject().keys();
+    const QJsonObject allowed = node.value(QLatin1String("properties")).toObject();
     const QStringList present = object.keys();
     for (const QString &name : present) {
         if (!allowed.contains(name))
-            return QStringLiteral("unknown member %1: must be one of %2")
-                .arg(written(name), writtenList(allowed));
+            return name;
     }
     return QString();
 }
@@ -159,10 +159,8 @@ QString expectation(const QJsonObject &node)
 
 QString explainValue(const QJsonObject &node, const QJsonValue &value)
 {
-    if (value.isObject() && typesOf(node).contains(QLatin1String("object"))) {
-        const QString unknown = unknownMember(node, value.toObject());
-        return unknown.isEmpty() ? missingMember(node, value.toObject()) : unknown;
-    }
+    if (value.isObject() && typesOf(node).contains(QLatin1String("object")))
+        return missingMember(node, value.toObject());
     const QString expected = expectation(node);
     if (expected.isEmpty())
         return QString();
@@ -170,6 +168,13 @@ QString explainValue(const QJsonObject &node, const QJsonValue &value)
     if (value.isArray() && typesOf(node).contains(QLatin1String("array")))
         return QLatin1String("must be ") + expected;
     return QStringLiteral("must be %1; %2").arg(expected, found(value));
+}
+
+QString atPath(const QStringList &path, const QString &explanation)
+{
+    if (explanation.isEmpty() || path.isEmpty())
+        return explanation;
+    return jsonPointer(path) + QLatin1String(": ") + explanation;
 }
 
 } // namespace
@@ -193,10 +198,13 @@ QString explainViolation(const QJsonObject &schema, const QJsonValue &document, 
         node = resolveReference(schema, node);
         value = elementOf(value, step);
     }
-    const QString explanation = explainValue(node, value);
-    if (explanation.isEmpty() || path.isEmpty())
-        return explanation;
-    return jsonPointer(path) + QLatin1String(": ") + explanation;
+    // A slip of the keyboard explains a missing member too, so it comes first.
+    const QString unknown = unknownMember(node, value.toObject());
+    if (unknown.isNull())
+        return atPath(path, explainValue(node, value));
+    const QStringList allowed = node.value(QLatin1String("properties")).toObject().keys();
+    return atPath(path + QStringList(unknown),
+                  QLatin1String("unknown member; must be one of ") + writtenList(allowed));
 }
 
 } // namespace Corvane

@@ -3,9 +3,6 @@
 
 #include <QtCore/QJsonArray>
 
-#include <algorithm>
-#include <utility>
-
 namespace Corvane
 {
 namespace Simulator
@@ -18,8 +15,11 @@ bool Sim::isUsable() const
     return present && harmless.contains(pin);
 }
 
-Sim Phone::cardWithImsi(const QString &imsi)
+Sim Phone::cardWithImsi(const QString &imsi) const
 {
+    const auto known = m_cards.find(imsi);
+    if (known != m_cards.end())
+        return known->second;
     Sim sim;
     sim.imsi = imsi;
     // A card number begins with 89; the rest only has to be as unique as the IMSI.
@@ -44,21 +44,9 @@ Phone::Phone(const QJsonObject &profile)
         const QJsonArray numbers = card.value(QLatin1String("numbers")).toArray();
         for (const QJsonValue &number : numbers)
             sim.numbers << number.toString();
+        m_cards.emplace(sim.imsi, sim);
         sims.push_back(sim);
     }
-}
-
-void Phone::replaceSim(std::size_t slot, const QString &imsi)
-{
-    const auto known
-        = std::find_if(drawer.begin(), drawer.end(), [&](const Sim &card) { return card.imsi == imsi; });
-    Sim card = cardWithImsi(imsi);
-    if (known != drawer.end()) {
-        card = *known;
-        drawer.erase(known);
-    }
-    drawer.push_back(std::exchange(sims.at(slot), card));
-    sims.at(slot).present = true;
 }
 
 std::optional<std::size_t> Phone::slotNumbered(const QString &text) const

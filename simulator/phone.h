@@ -6,6 +6,7 @@
 #include <QtCore/QString>
 #include <QtCore/QStringList>
 
+#include <map>
 #include <optional>
 #include <vector>
 
@@ -34,16 +35,16 @@ public:
     /** @p profile is complete and has been checked. */
     explicit Phone(const QJsonObject &profile);
 
-    /** The card that comes with @p imsi when nothing more is known of it. */
-    static Sim cardWithImsi(const QString &imsi);
-    /** Puts the card with @p imsi, out of the drawer or a new one, in the place of the one in @p slot. */
-    void replaceSim(std::size_t slot, const QString &imsi);
+    /** The card with @p imsi: one of the profile, or one made up for it. */
+    Sim cardWithImsi(const QString &imsi) const;
 
     /** The slot that @p text is the number of; empty when there is no such slot. */
     std::optional<std::size_t> slotNumbered(const QString &text) const;
 
     std::vector<Sim> sims; ///< by slot
-    std::vector<Sim> drawer; ///< cards that another one has taken the slot of
+
+private:
+    std::map<QString, Sim> m_cards; ///< of the profile, by IMSI
 };
 
 } // namespace Simulator

@@ -2,6 +2,7 @@
 #include "sandbox.h"
 
 #include <cerrno>
+#include <csignal>
 #include <cstring>
 #include <fcntl.h>
 #include <fstream>
@@ -13,6 +14,7 @@
 #include <sys/prctl.h>
 #include <sys/socket.h>
 #include <sys/stat.h>
+#include <sys/syscall.h>
 #include <system_error>
 #include <unistd.h>
 
@@ -86,15 +88,8 @@ bool inUserNamespace()
     return !(inside == 0 && outside == 0 && count == 0xffffffffUL);
 }
 
-void enterUserNamespace()
+void mapUser(uid_t uid, gid_t gid)
 {
-    const uid_t uid = getuid();
-    const gid_t gid = getgid();
-    if (unshare(CLONE_NEWUSER) < 0) {
-        throw SetUpError::fromErrno("cannot create a user namespace",
-                                    "allow it with the sysctls user.max_user_namespaces and "
-                                    "kernel.unprivileged_userns_clone, or run it as root");
-    }
     // The kernel wants this before an ordinary user may map a group.
     writeFile("/proc/self/setgroups", "deny");
     writeFile("/proc/self/uid_map", "0 " + std::to_string(uid) + " 1");
@@ -136,21 +131,20 @@ void mountDevices()
     const std::string dev = storage + "/dev";
     makeFolders(dev);
     mountOn(dev, "tmpfs", "phone", MS_NOSUID | MS_NOEXEC, "mode=0755");
-    for (const char *node : {"null", "zero", "full", "random", "urandom", "tty", "ptmx"}) {
+    for (const char *node : {"null", "zero", "full", "random", "urandom", "tty"}) {
         const std::string device = dev + "/" + node;
         writeFile(device, {});
         mountOn(device, nullptr, std::string("/dev/") + node, MS_BIND);
     }
-    // The caller's terminal must stay one inside.
+    // Terminals of its own: the machine's ptmx finds no terminals from another folder. The caller's terminal
+    // stays one.
     makeFolders(dev + "/pts");
-    mountOn(dev + "/pts", nullptr, "/dev/pts", MS_BIND | MS_REC);
+    mountOn(dev + "/pts", "devpts", "phone", MS_NOSUID | MS_NOEXEC, "newinstance,ptmxmode=0666,mode=0620");
     makeFolders(dev + "/shm");
     mountOn(dev + "/shm", "tmpfs", "phone", MS_NOSUID | MS_NODEV, "mode=1777");
     const std::pair<const char *, const char *> links[] = {
-        {"/proc/self/fd", "/fd"},
-        {"/proc/self/fd/0", "/stdin"},
-        {"/proc/self/fd/1", "/stdout"},
-        {"/proc/self/fd/2", "/stderr"},
+        {"/proc/self/fd", "/fd"},       {"/proc/self/fd/0", "/stdin"}, {"/proc/self/fd/1", "/stdout"},
+        {"/proc/self/fd/2", "/stderr"}, {"pts/ptmx", "/ptmx"},
     };
     for (const auto &[target, link] : links) {
         if (symlink(target, (dev + link).c_str()) < 0)
@@ -211,13 +205,23 @@ SetUpError SetUpError::fromErrno(const std::string &step, const std::string &adv
     return SetUpError(step + ": " + std::strerror(errno) + (advice.empty() ? "" : "; " + advice));
 }
 
-void enterNewNamespaces()
+pid_t forkIntoPhone()
 {
-    if (!hasCapability(CAP_SYS_ADMIN))
-        enterUserNamespace();
-    // Only children go there; the rest of the separation is the child's own.
-    if (unshare(CLONE_NEWPID) < 0)
-        throw SetUpError::fromErrno("cannot create a process namespace");
+    const bool isOrdinaryUser = !hasCapability(CAP_SYS_ADMIN);
+    const uid_t uid = getuid();
+    const gid_t gid = getgid();
+    // Not unshare(): the caller would no longer be able to create threads and processes of its own.
+    const auto pid = pid_t(syscall(SYS_clone, SIGCHLD | CLONE_NEWPID | (isOrdinaryUser ? CLONE_NEWUSER : 0),
+                                   nullptr, nullptr, nullptr, nullptr));
+    if (pid < 0) {
+        throw SetUpError::fromErrno("cannot create namespaces for users and processes",
+                                    isOrdinaryUser ? "allow it with the sysctls user.max_user_namespaces and "
+                                                     "kernel.unprivileged_userns_clone, or run it as root"
+                                                   : "allow it with the sysctl user.max_pid_namespaces");
+    }
+    if (pid == 0 && isOrdinaryUser)
+        mapUser(uid, gid);
+    return pid;
 }
 
 void buildPhone(const std::string &hostName, const PhoneFiles &files)

@@ -5,6 +5,7 @@
 #include <map>
 #include <stdexcept>
 #include <string>
+#include <sys/types.h>
 #include <vector>
 
 namespace Corvane
@@ -31,10 +32,10 @@ struct PhoneFiles {
 };
 
 /**
- * Separates the caller's next child from the machine: it becomes process 1 of a phone, with every right in
- * there also when the caller is an ordinary user. The caller itself keeps its view of the machine.
+ * Forks a process that is process 1 of a phone, with every right in there also when the caller is an ordinary
+ * user. The caller itself stays on the machine. Returns as fork() does.
  */
-void enterNewNamespaces();
+pid_t forkIntoPhone();
 
 /**
  * Builds the phone around the calling process, which is process 1 of new namespaces: the file system, the

@@ -79,7 +79,7 @@ QString SimTray::insert(const QStringList &arguments) const
         throw Refusal(QStringLiteral("The SIM %1 is in another slot; pull it there first").arg(imsi));
 
     if (imsi != sim.imsi)
-        m_phone.replaceSim(index, imsi);
+        sim = m_phone.cardWithImsi(imsi);
     sim.present = true;
     m_changed(index);
     return QStringLiteral("The SIM %1 is in slot %2").arg(imsi).arg(index);

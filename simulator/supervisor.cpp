@@ -117,6 +117,20 @@ void redirect(const std::string &fileName, int flags, int fd)
     }
 }
 
+/** Whether a shell would find @p program, which execvp() does not tell from a folder in PATH that it cannot
+ * enter. */
+bool isFound(const std::string &program)
+{
+    if (program.find('/') != std::string::npos)
+        return access(program.c_str(), F_OK) == 0;
+    std::istringstream folders(std::getenv("PATH"));
+    for (std::string folder; std::getline(folders, folder, ':');) {
+        if (access((folder + "/" + program).c_str(), F_OK) == 0)
+            return true;
+    }
+    return false;
+}
+
 /** A signal that asked for the end before the command could start. */
 struct Interruption {
     int signal;
@@ -282,7 +296,9 @@ void Supervisor::execute(const std::vector<std::string> &command)
         arguments.push_back(const_cast<char *>(argument.c_str()));
     arguments.push_back(nullptr);
     execvp(arguments[0], arguments.data());
-    const int error = errno;
+    int error = errno;
+    if (error == EACCES && !isFound(command.front()))
+        error = ENOENT;
     std::fprintf(stderr, "corvane-simulator: %s: %s\n", arguments[0],
                  error == ENOENT ? "command not found" : std::strerror(error));
     _exit(error == ENOENT ? 127 : 126);
@@ -527,11 +543,8 @@ int runInPhone(const RunSettings &settings)
         sigset_t callersSignals;
         sigprocmask(SIG_BLOCK, &handled, &callersSignals);
 
-        enterNewNamespaces();
         Pipe life;
-        const pid_t phone = fork();
-        if (phone < 0)
-            throw SetUpError::fromErrno("cannot start the phone's first process");
+        const pid_t phone = forkIntoPhone();
         if (phone == 0) {
             dieWithSimulator(life);
             return Supervisor(settings, callersSignals).run();

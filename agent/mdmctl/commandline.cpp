@@ -20,7 +20,7 @@ namespace Agent
 namespace
 {
 
-const QString jsonName = QStringLiteral("--json");
+const QLatin1String jsonName("--json");
 
 /** Where the walk along the words ended. */
 struct Found {
@@ -137,7 +137,7 @@ private:
     };
 
     void describe(CLI::App *app, const Command &command, const QString &path);
-    std::vector<std::string> &addInput(const Command &command, const QString &name);
+    Input &addInput(const Command &command, const QString &name);
     void addArgument(CLI::App *app, const Command &command, const Argument &argument);
     void addOption(CLI::App *app, const Command &command, const Option &option);
     QString explain(const CLI::ParseError &error) const;
@@ -172,33 +172,32 @@ void Parser::describe(CLI::App *app, const Command &command, const QString &path
     }
 }
 
-std::vector<std::string> &Parser::addInput(const Command &command, const QString &name)
+Parser::Input &Parser::addInput(const Command &command, const QString &name)
 {
     m_inputs.push_back({&command, name, nullptr, {}});
-    return m_inputs.back().values;
+    return m_inputs.back();
 }
 
 void Parser::addArgument(CLI::App *app, const Command &command, const Argument &argument)
 {
-    std::vector<std::string> &values = addInput(command, argument.name);
-    CLI::Option *option = app->add_option(argument.name.toStdString(), values, argument.help.toStdString());
-    option->required(argument.count != Argument::Optional);
-    option->expected(1, argument.count == Argument::Several ? -1 : 1);
-    option->allow_extra_args(argument.count == Argument::Several);
-    m_inputs.back().option = option;
+    Input &input = addInput(command, argument.name);
+    input.option = app->add_option(argument.name.toStdString(), input.values, argument.help.toStdString());
+    input.option->required(argument.count != Argument::Optional);
+    input.option->expected(1, argument.count == Argument::Several ? -1 : 1);
+    input.option->allow_extra_args(argument.count == Argument::Several);
 }
 
 void Parser::addOption(CLI::App *app, const Command &command, const Option &option)
 {
     const std::string name = option.name.toStdString();
     const std::string help = option.help.toStdString();
-    std::vector<std::string> &values = addInput(command, option.name);
+    Input &input = addInput(command, option.name);
     if (option.valueName.isEmpty()) {
-        m_inputs.back().option = app->add_flag(name, help);
-        return;
+        input.option = app->add_flag(name, help);
+    } else {
+        input.option = app->add_option(name, input.values, help)->expected(1);
+        input.option->type_name(option.valueName.toStdString());
     }
-    CLI::Option *added = app->add_option(name, values, help)->expected(1);
-    m_inputs.back().option = added->type_name(option.valueName.toStdString());
 }
 
 std::optional<int> Parser::parse(const QStringList &words)

@@ -14,8 +14,7 @@ namespace Agent
 namespace
 {
 
-const QString bashScript
-    = QStringLiteral(R"(# Completion of mdmctl for bash, written by "mdmctl completion bash".
+const QLatin1String bashScript(R"(# Completion of mdmctl for bash, written by "mdmctl completion bash".
 _mdmctl()
 {
     local current=${COMP_WORDS[COMP_CWORD]} previous=${COMP_WORDS[COMP_CWORD - 1]}

@@ -11,8 +11,8 @@ namespace Agent
 namespace
 {
 
-const QString jsonName = QStringLiteral("--json");
-const QString timeoutName = QStringLiteral("--timeout");
+const QLatin1String jsonName("--json");
+const QLatin1String timeoutName("--timeout");
 
 QString timeoutFault(const QString &value)
 {

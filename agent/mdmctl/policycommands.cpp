@@ -21,7 +21,7 @@ namespace Agent
 namespace
 {
 
-const QString fileArgument = QStringLiteral("FILE");
+const QLatin1String fileArgument("FILE");
 
 bool isAsWanted(const Setting &setting)
 {
@@ -127,10 +127,11 @@ int runApply(PolicyEngine &engine, const Policy &policy, const Values &values)
 
 QString reportLine(const Setting &setting)
 {
-    QString line = QStringLiteral("%1: %2").arg(setting.path, setting.statusName());
-    if (!setting.detail.isEmpty())
-        line += QStringLiteral(" (%1)").arg(setting.detail);
-    return line;
+    QString why = setting.detail;
+    if (why.isEmpty() && setting.status == Setting::Changed)
+        why = QStringLiteral("from %1 to %2").arg(setting.present.text, setting.wanted.text);
+    const QString line = QStringLiteral("%1: %2").arg(setting.path, setting.statusName());
+    return why.isEmpty() ? line : QStringLiteral("%1 (%2)").arg(line, why);
 }
 
 int runWatch(PolicyEngine &engine, const Policy &policy, const Values &values)
@@ -146,8 +147,7 @@ int runWatch(PolicyEngine &engine, const Policy &policy, const Values &values)
         log.write(QStringLiteral("Watching for drift from %1.").arg(policy.name),
                   {{event, QStringLiteral("watching")}, {QStringLiteral("policy"), policy.name}});
     });
-    engine.watch(policy);
-    return ExitDone;
+    return concludeWatch(engine.watch(policy));
 }
 
 int runExport(const Values &values)
@@ -183,7 +183,7 @@ Command command(const QString &name, const QString &summary,
     return command;
 }
 
-const QString reportHelp = QStringLiteral(
+const QLatin1String reportHelp(
     "JSON: {\"policy\": \"...\", \"compliant\": false, \"settings\": [{\"path\": \"calls.dial.default\",\n"
     "\"status\": \"different\", \"present\": \"allow\", \"wanted\": \"block\", \"detail\": \"\"}]}");
 

@@ -19,8 +19,8 @@ using Mdm::SoftwareUpdate;
 namespace
 {
 
-const QString waitName = QStringLiteral("--wait");
-const QString versionName = QStringLiteral("VERSION");
+const QLatin1String waitName("--wait");
+const QLatin1String versionName("VERSION");
 
 QJsonValue versionJson(const QString &version)
 {

@@ -24,14 +24,14 @@ QJsonObject Policy::settingsOf(const PolicySection &section) const
 Policy readPolicy(const QString &fileName, const PolicySections &sections)
 {
     const JsonDocument document = readJsonDocument(fileName, policySchema());
-    Policy policy{document.object.value(QLatin1String("name")).toString(fileName), document.object,
-                  document.error};
+    Policy policy{document.object.value(QLatin1String("name")).toString(documentName(fileName)),
+                  document.object, document.error};
     if (!policy.isValid())
         return policy;
     for (const auto &section : sections) {
         const QString fault = section->fault(policy.settingsOf(*section));
         if (!fault.isEmpty()) {
-            policy.error = QStringLiteral("%1: %2").arg(fileName, fault);
+            policy.error = QStringLiteral("%1: %2").arg(documentName(fileName), fault);
             break;
         }
     }

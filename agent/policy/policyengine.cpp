@@ -2,6 +2,7 @@
 #include "policyengine.h"
 
 #include "interruption.h"
+#include "systembus.h"
 
 #include <QtCore/QSysInfo>
 #include <QtDBus/QDBusConnection>
@@ -127,27 +128,37 @@ Setting PolicyEngine::changed(PolicySection *section, const Setting &setting)
     return unanswered(setting, reply, Setting::Failed);
 }
 
-void PolicyEngine::watch(const Policy &policy)
+Reply PolicyEngine::watch(const Policy &policy)
 {
+    Reply end = SystemBus::reach();
+    const SystemBus bus;
+    connect(&bus, &SystemBus::lost, this, [&](const Reply &reply) {
+        end = reply;
+        m_loop.quit();
+    });
     if (Interruption *interruption = Interruption::instance())
         connect(interruption, &Interruption::requested, &m_loop, &QEventLoop::quit);
     for (Entry &entry : m_entries) {
         if (!policy.settingsOf(*entry.section).isEmpty())
             follow(entry);
     }
+    const auto isOver = [&] {
+        return isInterrupted() || !end.isDone();
+    };
     const auto isDue = [](const Entry &entry) {
         return entry.due;
     };
-    for (bool applied = false; !isInterrupted(); applied = true) {
+    for (bool applied = false; !isOver(); applied = true) {
         for (Entry &entry : m_entries) {
             if (entry.due)
                 takeUp(entry, policy);
         }
         if (!applied)
             Q_EMIT watching();
-        if (!isInterrupted() && std::none_of(m_entries.cbegin(), m_entries.cend(), isDue))
+        if (!isOver() && std::none_of(m_entries.cbegin(), m_entries.cend(), isDue))
             m_loop.exec();
     }
+    return end.isDone() ? interrupted() : end;
 }
 
 void PolicyEngine::follow(Entry &entry)

@@ -34,10 +34,10 @@ public:
     QVector<Setting> apply(const Policy &policy);
 
     /**
-     * Applies @p policy and puts right what drifts from it, until an Interruption is requested. A service
-     * that leaves and comes back is taken up again.
+     * Applies @p policy and puts right what drifts from it, until an Interruption is requested or the system
+     * bus is gone. A service that leaves and comes back is taken up again.
      */
-    void watch(const Policy &policy);
+    Reply watch(const Policy &policy);
 
     /** The phone's present state, and the sections that could not be asked. */
     struct Export {

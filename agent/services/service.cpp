@@ -1,6 +1,8 @@
 // SPDX-License-Identifier: LGPL-2.1-or-later
 #include "service.h"
 
+#include "systembus.h"
+
 #include <QtDBus/QDBusConnection>
 #include <QtDBus/QDBusConnectionInterface>
 #include <QtDBus/QDBusReply>
@@ -33,13 +35,10 @@ bool Service::isRunning() const
 
 Reply Service::ensureRunning() const
 {
+    const Reply reached = SystemBus::reach();
+    if (!reached.isDone() || isRunning())
+        return reached;
     const QDBusConnection bus = QDBusConnection::systemBus();
-    if (!bus.isConnected()) {
-        return {Reply::ServiceLost,
-                QStringLiteral("the system bus cannot be reached: %1").arg(bus.lastError().message())};
-    }
-    if (isRunning())
-        return {};
     const QStringList activatable = bus.interface()->activatableServiceNames();
     if (!activatable.contains(name))
         return notRunning();

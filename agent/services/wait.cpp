@@ -13,11 +13,7 @@ namespace Agent
 namespace
 {
 
-const QString &refusalPattern()
-{
-    static const QString pattern = QStringLiteral(R"(^Method call failed: |GetAll\(\) failed: )");
-    return pattern;
-}
+const QLatin1String refusals(R"(^Method call failed: |GetAll\(\) failed: |^search\(\) failed: )");
 
 QString seconds(std::chrono::milliseconds time)
 {
@@ -29,12 +25,13 @@ QString seconds(std::chrono::milliseconds time)
 Wait::Wait(const Service &service, std::chrono::milliseconds time, const QString &awaited)
     : m_service(service)
     , m_watcher(service.name, QDBusConnection::systemBus(), QDBusServiceWatcher::WatchForUnregistration)
-    , m_refusals(refusalPattern(), [this](const QString &reason) {
+    , m_refusals(refusals, [this](const QString &reason) {
         end(Reply::Refused, QStringLiteral("%1 refused: %2").arg(m_service.toString(), reason));
     })
 {
     connect(&m_watcher, &QDBusServiceWatcher::serviceUnregistered, this,
             [this] { end(Reply::ServiceLost, m_service.notRunning().text); });
+    connect(&m_bus, &SystemBus::lost, this, [this](const Reply &reply) { end(reply.outcome, reply.text); });
     if (Interruption *interruption = Interruption::instance()) {
         connect(interruption, &Interruption::requested, this, [this] { end(Reply::Interrupted); });
         if (interruption->isRequested())
@@ -72,6 +69,9 @@ Reply Wait::run()
         end(Reply::ServiceLost, m_service.notRunning().text);
     if (!m_ended)
         m_loop.exec();
+    // The bus refuses in the place of a service that died over the request.
+    if (m_reply.outcome == Reply::Refused && !m_service.isRunning())
+        return m_service.notRunning();
     return m_reply;
 }
 

@@ -4,6 +4,7 @@
 
 #include "reply.h"
 #include "service.h"
+#include "systembus.h"
 #include "warningcapture.h"
 
 #include <QtCore/QEventLoop>
@@ -53,6 +54,7 @@ private:
     Service m_service;
     QEventLoop m_loop;
     QTimer m_timer;
+    SystemBus m_bus;
     QDBusServiceWatcher m_watcher;
     WarningCapture m_refusals;
     Reply m_reply;

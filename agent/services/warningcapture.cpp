@@ -6,7 +6,6 @@
 
 #include <algorithm>
 #include <cstdio>
-#include <cstdlib>
 #include <vector>
 
 namespace Corvane
@@ -17,8 +16,17 @@ namespace Agent
 namespace
 {
 
-std::vector<const WarningCapture *> captures;
-QByteArray messagePrefix;
+std::vector<const WarningCapture *> &captures()
+{
+    static std::vector<const WarningCapture *> all;
+    return all;
+}
+
+QByteArray &messagePrefix()
+{
+    static QByteArray prefix;
+    return prefix;
+}
 
 bool onMainThread()
 {
@@ -31,17 +39,18 @@ WarningCapture::WarningCapture(const QString &pattern, std::function<void(const 
     : m_pattern(pattern)
     , m_taker(std::move(taker))
 {
-    captures.push_back(this);
+    captures().push_back(this);
 }
 
 WarningCapture::~WarningCapture()
 {
-    captures.erase(std::remove(captures.begin(), captures.end(), this), captures.end());
+    auto &all = captures();
+    all.erase(std::remove(all.begin(), all.end(), this), all.end());
 }
 
 void WarningCapture::install(const QByteArray &prefix)
 {
-    messagePrefix = prefix;
+    messagePrefix() = prefix;
     qInstallMessageHandler(handle);
 }
 
@@ -62,15 +71,13 @@ void WarningCapture::handle(QtMsgType type, const QMessageLogContext &, const QS
         return;
     if (onMainThread()) {
         const auto taken
-            = std::find_if(captures.crbegin(), captures.crend(),
+            = std::find_if(captures().crbegin(), captures().crend(),
                            [&](const WarningCapture *capture) { return capture->take(message); });
-        if (taken != captures.crend())
+        if (taken != captures().crend())
             return;
     }
-    const QByteArray line = messagePrefix + "warning: " + message.toLocal8Bit() + '\n';
+    const QByteArray line = messagePrefix() + "warning: " + message.toLocal8Bit() + '\n';
     std::fwrite(line.constData(), 1, std::size_t(line.size()), stderr);
-    if (type == QtFatalMsg)
-        std::abort();
 }
 
 bool WarningCapture::take(const QString &message) const

@@ -16,7 +16,7 @@ namespace Agent
  * Takes matching warnings out of Qt's message stream for as long as it lives.
  *
  * The library tells of refused requests and failed queries by warnings alone. The newest capture is asked
- * first; what none takes is printed.
+ * first; what none takes is printed. Debug messages are dropped.
  */
 class WarningCapture
 {

@@ -321,8 +321,14 @@ QString AtModem::accessFile(const QStringList &arguments, QStringList &lines) co
         return answerOfCard(notPermitted);
     if (access == ReadBinary && file.structure == SimFile::Transparent) {
         const QByteArray &content = file.records.first();
+        constexpr int largestByte = 255;
+        const auto isByte = [](int number) {
+            return number >= 0 && number <= largestByte;
+        };
+        if (!isByte(first) || !isByte(second) || !isByte(length))
+            return answerOfCard(wrongLength);
         const int offset = first << 8 | second;
-        if (first < 0 || second < 0 || length < 0 || offset + length > content.size())
+        if (offset + length > content.size())
             return answerOfCard(wrongLength);
         return answerOfCard(done, content.mid(offset, length));
     }

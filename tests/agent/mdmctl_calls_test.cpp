@@ -1,4 +1,5 @@
 // SPDX-License-Identifier: LGPL-2.1-or-later
+#include "callalarm.h"
 #include "mdmctl.h"
 #include "phone.h"
 #include "waiting.h"
@@ -72,6 +73,7 @@ private:
     QStringList changes();
 
     Phone m_phone;
+    CallAlarm m_alarm;
 };
 
 void MdmctlCallsTest::init()

@@ -1,4 +1,5 @@
 // SPDX-License-Identifier: LGPL-2.1-or-later
+#include "callalarm.h"
 #include "mdmctl.h"
 #include "phone.h"
 #include "waiting.h"
@@ -91,6 +92,7 @@ private Q_SLOTS:
     void watchTakesUpAServiceThatComesBack();
     void watchInstallsAnUpdateThatAppears();
     void watchDoesNotRepeatARefusedChange();
+    void watchEndsWithTheBus();
     void examplesAreValid_data();
     void examplesAreValid();
     void schemaIsPrinted();
@@ -103,6 +105,7 @@ private:
     QString publish();
 
     Phone m_phone;
+    CallAlarm m_alarm;
     QTemporaryDir m_folder;
     int m_versions = 0;
 };
@@ -224,7 +227,10 @@ void MdmctlPolicyTest::orderOfRulesDoesNotMatter()
 void MdmctlPolicyTest::policyFromStandardInput()
 {
     const QStringList arguments{QStringLiteral("policy"), QStringLiteral("check"), QStringLiteral("-")};
-    QCOMPARE(Mdmctl::run(arguments, R"({"calls": {"dial": {"default": "block"}}})").status, 1);
+    const Mdmctl::Result checked = Mdmctl::run(arguments, R"({"calls": {"dial": {"default": "block"}}})");
+    QVERIFY2(checked.output.endsWith(QStringLiteral("standard input: 1 different.\n")),
+             qPrintable(checked.output));
+    QCOMPARE(checked.status, 1);
     const Mdmctl::Result wrong = Mdmctl::run(arguments, R"({"calls": {"dial": {"default": "hangup"}}})");
     QCOMPARE(
         wrong.errors,
@@ -244,13 +250,14 @@ void MdmctlPolicyTest::wrongPolicyIsRefusedWithThePath_data()
     QTest::addColumn<QByteArray>("policy");
     QTest::addColumn<QString>("error");
 
-    QTest::newRow("syntax") << QByteArray("{\n\"calls\": }") << R"(FILE:2:10: illegal value)";
+    QTest::newRow("syntax") << QByteArray("{\n\"calls\": ,}") << R"(FILE:2:10: illegal value)";
     QTest::newRow("unknown family")
         << QByteArray(R"({"call": {}})")
-        << R"(FILE: unknown member "call": must be one of "$schema", "calls", "description", "name", "softwareUpdate")";
+        << R"(FILE: /call: unknown member; must be one of "$schema", "calls", "data", )"
+           R"("description", "name", "sms", "softwareUpdate")";
     QTest::newRow("unknown member")
         << QByteArray(R"({"calls": {"dail": {}}})")
-        << R"(FILE: /calls: unknown member "dail": must be one of "dial", "incoming")";
+        << R"(FILE: /calls/dail: unknown member; must be one of "dial", "incoming")";
     QTest::newRow("action of the other direction")
         << QByteArray(R"({"calls": {"dial": {"rules": [{"imsi": "1", "action": "hangup"}]}}})")
         << R"(FILE: /calls/dial/rules/0/action: must be one of "allow", "block"; is "hangup")";
@@ -470,6 +477,8 @@ void MdmctlPolicyTest::exportIsWhatCheckAccepts()
     QCOMPARE(policy,
              json(R"({"calls": {"dial": {"default": "allow", "rules": [{"imsi": "1", "action": "block"}]},
                                         "incoming": {"default": "hangup", "rules": []}},
+                              "sms": {"default": "allow", "rules": []},
+                              "data": {"default": "allow", "rules": []},
                               "softwareUpdate": {"install": "latest"}})"));
     QCOMPARE(run(QStringLiteral("check"), exported.output.toUtf8()).status, 0);
     call(Dial, QStringLiteral("ClearRules"));
@@ -489,9 +498,14 @@ void MdmctlPolicyTest::exportWithoutAService()
 {
     m_phone.stopService(Ofono);
     const Mdmctl::Result exported = Mdmctl::run({QStringLiteral("policy"), QStringLiteral("export")});
-    QCOMPARE(exported.errors,
-             QStringLiteral("mdmctl: \"calls\" is left out: the telephony service (org.ofono) is "
-                            "not running\n"));
+    QCOMPARE(exported.errors, [] {
+        QString errors;
+        for (const char *section : {"calls", "sms", "data"})
+            errors += QStringLiteral(
+                          "mdmctl: \"%1\" is left out: the telephony service (org.ofono) is not running\n")
+                          .arg(QLatin1String(section));
+        return errors;
+    }());
     QVERIFY(exported.json().contains(QStringLiteral("softwareUpdate")));
     QCOMPARE(exported.status, 3);
 }
@@ -532,15 +546,17 @@ void MdmctlPolicyTest::watchAppliesAndPutsDriftRight()
 
 void MdmctlPolicyTest::watchFollowsTheSims()
 {
-    m_phone.act(QStringLiteral("sim pull"), {QStringLiteral("2")});
+    m_phone.act(QStringLiteral("sim pull"), {QStringLiteral("1")});
     Mdmctl watch({QStringLiteral("policy"), QStringLiteral("watch"),
                   write(R"({"calls": {"dial": {"rules": [{"imsi": "*", "action": "block"}]}}})")});
     QVERIFY(watch.waitForOutput(QStringLiteral("Watching for drift from ")));
     QCOMPARE(filter(QStringLiteral("dial")),
              json(R"({"default": "allow", "rules": [{"imsi": "244051234567890", "action": "block"}]})"));
-    m_phone.act(QStringLiteral("sim insert"), {QStringLiteral("2"), QStringLiteral("262029999999999")});
+    m_phone.act(QStringLiteral("sim insert"), {QStringLiteral("1"), QStringLiteral("262029999999999")});
     QVERIFY(watch.waitForOutput(QStringLiteral("calls.dial.rules: changed (add 262029999999999=block)\n")));
-    m_phone.act(QStringLiteral("sim insert"), {QStringLiteral("2"), QStringLiteral("262021234567891")});
+    m_phone.act(QStringLiteral("sim pull"), {QStringLiteral("1")});
+    QVERIFY(watch.waitForOutput(QStringLiteral("calls.dial.rules: changed (remove 262029999999999)\n")));
+    m_phone.act(QStringLiteral("sim insert"), {QStringLiteral("1"), QStringLiteral("262021234567891")});
     QVERIFY(watch.waitForOutput(QStringLiteral("add 262021234567891=block")));
     QVERIFY(waitUntil([this] {
         return filter(QStringLiteral("dial"))
@@ -563,7 +579,7 @@ void MdmctlPolicyTest::watchTakesUpAServiceThatComesBack()
     m_phone.startService(Ofono);
     QVERIFY(watch.waitForOutput(QStringLiteral("calls.dial.default: compliant\n")));
     call(Dial, QStringLiteral("SetDefaultAction"), {2u});
-    QVERIFY(watch.waitForOutput(QStringLiteral("calls.dial.default: changed\n"), 2));
+    QVERIFY(watch.waitForOutput(QStringLiteral("calls.dial.default: changed (from allow to block)\n"), 2));
     QCOMPARE(filter(QStringLiteral("dial")).value(QLatin1String("default")).toString(),
              QStringLiteral("block"));
     watch.interrupt(SIGINT);
@@ -608,9 +624,27 @@ void MdmctlPolicyTest::watchDoesNotRepeatARefusedChange()
              QStringList(Dial + QStringLiteral(" SetDefaultAction (uint32 1,)")));
     m_phone.clearFaults();
     call(Dial, QStringLiteral("AddRule"), {QStringLiteral("1"), 1u});
-    QVERIFY(watch.waitForOutput(QStringLiteral("calls.dial.default: changed\n")));
+    QVERIFY(watch.waitForOutput(QStringLiteral("calls.dial.default: changed (from allow to block)\n")));
     watch.interrupt(SIGINT);
     QCOMPARE(watch.finish().status, 0);
+}
+
+void MdmctlPolicyTest::watchEndsWithTheBus()
+{
+    QProcess bus;
+    bus.start(QStringLiteral("dbus-daemon"),
+              {QStringLiteral("--session"), QStringLiteral("--nofork"), QStringLiteral("--print-address")});
+    QVERIFY(bus.waitForReadyRead());
+    qputenv("DBUS_SYSTEM_BUS_ADDRESS", bus.readLine().trimmed());
+    Mdmctl watch({QStringLiteral("policy"), QStringLiteral("watch"),
+                  write(R"({"calls": {"dial": {"default": "block"}}})")});
+    qunsetenv("DBUS_SYSTEM_BUS_ADDRESS");
+    QVERIFY(watch.waitForOutput(QStringLiteral("Watching for drift from ")));
+    bus.kill();
+    QVERIFY(bus.waitForFinished());
+    const Mdmctl::Result watched = watch.finish();
+    QCOMPARE(watched.errors, QStringLiteral("mdmctl: the system bus is gone\n"));
+    QCOMPARE(watched.status, 3);
 }
 
 void MdmctlPolicyTest::examplesAreValid_data()

@@ -1,4 +1,5 @@
 // SPDX-License-Identifier: LGPL-2.1-or-later
+#include "callalarm.h"
 #include "mdmctl.h"
 #include "phone.h"
 #include "waiting.h"
@@ -73,6 +74,7 @@ private:
     QString onTerminal(const QString &arguments, const std::function<void()> &meanwhile, int *status);
 
     Phone m_phone;
+    CallAlarm m_alarm;
     QString m_version; // on offer
     int m_versions = 0;
 };

@@ -27,10 +27,10 @@ private Q_SLOTS:
         QVERIFY(elapsed.elapsed() < 60000);
         const QStringList warnings = log.takeWarnings();
         QCOMPARE(warnings.size(), 1);
-        QVERIFY2(warnings.first().startsWith(
-                     QLatin1String("Failed to get latest available OS version "
-                                   "QDBusError(\"org.freedesktop.DBus.Error.NoReply\", ")),
-                 qPrintable(warnings.first()));
+        QVERIFY2(
+            warnings.first().startsWith(QLatin1String("Failed to get latest available OS version "
+                                                      "QDBusError(\"org.freedesktop.DBus.Error.NoReply\", ")),
+            qPrintable(warnings.first()));
     }
 };
 

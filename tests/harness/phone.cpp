@@ -157,7 +157,11 @@ void Phone::ping(const QString &service) const
 {
     QDBusPendingCallWatcher watcher(QDBusConnection::systemBus().asyncCall(QDBusMessage::createMethodCall(
         service, QStringLiteral("/"), QStringLiteral("org.freedesktop.DBus.Peer"), QStringLiteral("Ping"))));
-    if (!waitUntil([&watcher] { return watcher.isFinished(); }))
+    // Not isFinished(): that is true as soon as QtDBus's thread has the answer, while the signal comes
+    // through the event loop of this one, after all that arrived before.
+    bool finished = false;
+    QObject::connect(&watcher, &QDBusPendingCallWatcher::finished, [&finished] { finished = true; });
+    if (!waitUntil([&finished] { return finished; }))
         qFatal("%s does not answer", qPrintable(service));
 }
 

@@ -121,10 +121,10 @@ void JsonDocumentTest::namesThePathOfAViolation_data()
 
     QTest::newRow("unknown member at the top")
         << QByteArray(R"({"name": "a", "nam": "b"})")
-        << R"(FILE: unknown member "nam": must be one of "a/b~c", "alias", "extra", "level", "limited", "name", "sims", "tags", "version")";
+        << R"(FILE: /nam: unknown member; must be one of "a/b~c", "alias", "extra", "level", "limited", "name", "sims", "tags", "version")";
     QTest::newRow("unknown member")
         << QByteArray(R"({"name": "a", "sims": [{"imsi": "1"}, {"imsl": "1"}]})")
-        << R"(FILE: /sims/1: unknown member "imsl": must be one of "action", "imsi")";
+        << R"(FILE: /sims/1/imsl: unknown member; must be one of "action", "imsi")";
     QTest::newRow("missing member at the top") << QByteArray("{}") << R"(FILE: must have a member "name")";
     QTest::newRow("missing member") << QByteArray(R"({"name": "a", "sims": [{"action": "block"}]})")
                                     << R"(FILE: /sims/0: must have a member "imsi")";

@@ -1,0 +1,35 @@
+// SPDX-License-Identifier: LGPL-2.1-or-later
+#include "systembus.h"
+
+#include <QtDBus/QDBusConnection>
+#include <QtDBus/QDBusError>
+
+namespace Corvane
+{
+namespace Agent
+{
+
+SystemBus::SystemBus(QObject *parent)
+    : QObject(parent)
+{
+    QDBusConnection::systemBus().connect(QString(), QStringLiteral("/org/freedesktop/DBus/Local"),
+                                         QStringLiteral("org.freedesktop.DBus.Local"),
+                                         QStringLiteral("Disconnected"), this, SLOT(tellLost()));
+}
+
+Reply SystemBus::reach()
+{
+    const QDBusConnection bus = QDBusConnection::systemBus();
+    if (bus.isConnected())
+        return {};
+    return {Reply::ServiceLost,
+            QStringLiteral("the system bus cannot be reached: %1").arg(bus.lastError().message())};
+}
+
+void SystemBus::tellLost()
+{
+    Q_EMIT lost({Reply::ServiceLost, QStringLiteral("the system bus is gone")});
+}
+
+} // namespace Agent
+} // namespace Corvane

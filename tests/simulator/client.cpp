@@ -1,0 +1,181 @@
+// SPDX-License-Identifier: LGPL-2.1-or-later
+#include "client.h"
+
+#include "waiting.h"
+
+#include <QtCore/QUuid>
+#include <QtDBus/QDBusMetaType>
+#include <QtDBus/QDBusObjectPath>
+#include <QtDBus/QDBusPendingCall>
+#include <QtDBus/QDBusPendingCallWatcher>
+#include <QtDBus/QDBusVariant>
+
+QDBusArgument &operator<<(QDBusArgument &out, const WireRule &rule)
+{
+    out.beginStructure();
+    out << rule.imsi << rule.action;
+    out.endStructure();
+    return out;
+}
+
+const QDBusArgument &operator>>(const QDBusArgument &in, WireRule &rule)
+{
+    in.beginStructure();
+    in >> rule.imsi >> rule.action;
+    in.endStructure();
+    return in;
+}
+
+namespace
+{
+
+QString textOf(const QVariant &value);
+
+QString textOf(const QDBusArgument &argument)
+{
+    QStringList parts;
+    switch (argument.currentType()) {
+    case QDBusArgument::ArrayType:
+        argument.beginArray();
+        while (!argument.atEnd())
+            parts << textOf(argument.asVariant());
+        argument.endArray();
+        return QLatin1Char('[') + parts.join(QLatin1String(", ")) + QLatin1Char(']');
+    case QDBusArgument::StructureType:
+        argument.beginStructure();
+        while (!argument.atEnd())
+            parts << textOf(argument.asVariant());
+        argument.endStructure();
+        return QLatin1Char('(') + parts.join(QLatin1String(", ")) + QLatin1Char(')');
+    case QDBusArgument::MapType:
+        argument.beginMap();
+        while (!argument.atEnd()) {
+            argument.beginMapEntry();
+            const QString key = textOf(argument.asVariant());
+            parts << key + QLatin1Char('=') + textOf(argument.asVariant());
+            argument.endMapEntry();
+        }
+        argument.endMap();
+        return QLatin1Char('{') + parts.join(QLatin1String(", ")) + QLatin1Char('}');
+    default:
+        return textOf(argument.asVariant());
+    }
+}
+
+QString textOf(const QVariant &value)
+{
+    if (value.userType() == qMetaTypeId<QDBusArgument>())
+        return textOf(qvariant_cast<QDBusArgument>(value));
+    if (value.userType() == qMetaTypeId<QDBusVariant>())
+        return QLatin1Char('<') + textOf(qvariant_cast<QDBusVariant>(value).variant()) + QLatin1Char('>');
+    if (value.userType() == qMetaTypeId<QDBusObjectPath>())
+        return qvariant_cast<QDBusObjectPath>(value).path();
+    if (value.userType() == QMetaType::QStringList)
+        return QLatin1Char('[') + value.toStringList().join(QLatin1String(", ")) + QLatin1Char(']');
+    return value.toString();
+}
+
+QString textOf(const QVariantList &values)
+{
+    QStringList parts;
+    for (const QVariant &value : values)
+        parts << textOf(value);
+    return QLatin1Char('(') + parts.join(QLatin1String(", ")) + QLatin1Char(')');
+}
+
+} // namespace
+
+Client::Client()
+    : m_connectionName(QUuid::createUuid().toString())
+    , m_connection(QDBusConnection::connectToBus(QDBusConnection::SystemBus, m_connectionName))
+{
+    qDBusRegisterMetaType<WireRule>();
+    qDBusRegisterMetaType<WireRules>();
+    qDBusRegisterMetaType<QList<QDBusVariant>>();
+}
+
+Client::~Client()
+{
+    QDBusConnection::disconnectFromBus(m_connectionName);
+}
+
+QString Client::uniqueName() const
+{
+    return m_connection.baseService();
+}
+
+QDBusMessage Client::call(const QString &service, const QString &path, const QString &interface,
+                          const QString &member, const QVariantList &arguments) const
+{
+    QDBusMessage message = QDBusMessage::createMethodCall(service, path, interface, member);
+    message.setArguments(arguments);
+    QDBusPendingCallWatcher watcher(m_connection.asyncCall(message));
+    // By the event loop: signals that come before the answer must not stay behind it.
+    waitUntil([&] { return watcher.isFinished(); });
+    return watcher.reply();
+}
+
+QDBusMessage Client::control(const QString &member, const QVariantList &arguments) const
+{
+    return call(QStringLiteral("org.corvaneos.simulator"), QStringLiteral("/org/corvaneos/simulator"),
+                QStringLiteral("org.corvaneos.simulator.Control"), member, arguments);
+}
+
+void Client::send(const QString &service, const QString &path, const QString &interface,
+                  const QString &member, const QVariantList &arguments) const
+{
+    QDBusMessage message = QDBusMessage::createMethodCall(service, path, interface, member);
+    message.setArguments(arguments);
+    m_connection.send(message);
+}
+
+void Client::callAndNote(const QString &service, const QString &path, const QString &interface,
+                         const QString &member, const QVariantList &arguments)
+{
+    QDBusMessage message = QDBusMessage::createMethodCall(service, path, interface, member);
+    message.setArguments(arguments);
+    auto *watcher = new QDBusPendingCallWatcher(m_connection.asyncCall(message), this);
+    connect(watcher, &QDBusPendingCallWatcher::finished, this, [this](QDBusPendingCallWatcher *answered) {
+        m_signals << (answered->isError() ? answered->error().name() : QStringLiteral("answer"));
+    });
+}
+
+void Client::watch(const QString &service, const QString &path, const QString &interface,
+                   const QStringList &members)
+{
+    for (const QString &member : members) {
+        if (!m_connection.connect(service, path, interface, member, this, SLOT(note(QDBusMessage))))
+            qFatal("cannot watch %s", qPrintable(member));
+    }
+}
+
+bool Client::waitForSignals(int count) const
+{
+    return waitUntil([&] { return m_signals.size() >= count; });
+}
+
+QStringList Client::takeSignals(const QString &service)
+{
+    call(service, QStringLiteral("/"), QStringLiteral("org.freedesktop.DBus.Peer"), QStringLiteral("Ping"));
+    return std::exchange(m_signals, {});
+}
+
+void Client::note(const QDBusMessage &signal)
+{
+    m_signals << signal.member() + textOf(signal.arguments());
+}
+
+QVariant boxed(const QVariantList &values)
+{
+    QList<QDBusVariant> boxes;
+    for (const QVariant &value : values)
+        boxes << QDBusVariant(value);
+    return QVariant::fromValue(boxes);
+}
+
+QString textOf(const QDBusMessage &message)
+{
+    if (message.type() == QDBusMessage::ErrorMessage)
+        return message.errorName() + QStringLiteral(": ") + message.errorMessage();
+    return QStringLiteral("reply") + textOf(message.arguments());
+}

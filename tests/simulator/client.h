@@ -1,0 +1,70 @@
+// SPDX-License-Identifier: LGPL-2.1-or-later
+#ifndef CORVANE_TEST_CLIENT_H
+#define CORVANE_TEST_CLIENT_H
+
+#include <QtCore/QObject>
+#include <QtCore/QStringList>
+#include <QtCore/QVariantList>
+#include <QtDBus/QDBusArgument>
+#include <QtDBus/QDBusConnection>
+#include <QtDBus/QDBusMessage>
+
+/** A rule as the wire has it. */
+struct WireRule {
+    QString imsi;
+    quint32 action;
+};
+Q_DECLARE_METATYPE(WireRule)
+QDBusArgument &operator<<(QDBusArgument &out, const WireRule &rule);
+const QDBusArgument &operator>>(const QDBusArgument &in, WireRule &rule);
+using WireRules = QList<WireRule>;
+Q_DECLARE_METATYPE(WireRules)
+
+/**
+ * A client of the phone's bus with a connection of its own, which knows nothing but messages.
+ *
+ * It notes each signal that reaches it from the watched objects, in the order of arrival, as
+ * "member(arguments)".
+ */
+class Client : public QObject
+{
+    Q_OBJECT
+
+public:
+    Client();
+    ~Client() override;
+
+    QString uniqueName() const;
+    /** Calls and waits; an interface that is empty is left out of the message. */
+    QDBusMessage call(const QString &service, const QString &path, const QString &interface,
+                      const QString &member, const QVariantList &arguments = {}) const;
+    QDBusMessage control(const QString &member, const QVariantList &arguments = {}) const;
+    /** Sends a call whose answer is dropped. */
+    void send(const QString &service, const QString &path, const QString &interface, const QString &member,
+              const QVariantList &arguments = {}) const;
+
+    /** Sends a call whose answer is noted among the signals, as "answer" or the name of the error. */
+    void callAndNote(const QString &service, const QString &path, const QString &interface,
+                     const QString &member, const QVariantList &arguments = {});
+
+    void watch(const QString &service, const QString &path, const QString &interface,
+               const QStringList &members);
+    bool waitForSignals(int count) const;
+    /** The signals since construction or the last call; what @p service has sent before is among them. */
+    QStringList takeSignals(const QString &service);
+
+private Q_SLOTS:
+    void note(const QDBusMessage &signal);
+
+private:
+    const QString m_connectionName;
+    QDBusConnection m_connection;
+    QStringList m_signals;
+};
+
+/** @p values as an argument of type av. */
+QVariant boxed(const QVariantList &values);
+/** "name: message" of an error, "reply(arguments)" of anything else. */
+QString textOf(const QDBusMessage &message);
+
+#endif // CORVANE_TEST_CLIENT_H
