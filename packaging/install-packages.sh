@@ -40,7 +40,7 @@ install_packages() {
         become=(sudo)
     fi
 
-    echo "installing ${#missing[@]} packages: ${missing[*]}"
+    echo "installing: ${missing[*]}"
     local log
     log=$(mktemp)
     # The package lists may be absent or too old; they are fetched only when the first attempt says so.

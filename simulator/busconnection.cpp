@@ -47,7 +47,13 @@ void MethodCall::reply(GVariant *values)
     g_dbus_method_invocation_return_value(m_invocation, values);
 }
 
+void MethodCall::fail(const MethodError &error)
+{
+    g_dbus_method_invocation_return_dbus_error(m_invocation, error.name().toUtf8().constData(), error.what());
+}
+
 BusConnection::BusConnection()
+    : m_lifetime(g_cancellable_new())
 {
     ErrorSlot error;
     m_connection.reset(g_dbus_connection_new_for_address_sync(
@@ -61,6 +67,9 @@ BusConnection::BusConnection()
 
 BusConnection::~BusConnection()
 {
+    g_cancellable_cancel(m_lifetime.get());
+    if (m_signalSubscription)
+        g_dbus_connection_signal_unsubscribe(m_connection.get(), m_signalSubscription);
     if (m_nameSubscription)
         g_dbus_connection_signal_unsubscribe(m_connection.get(), m_nameSubscription);
     for (const std::unique_ptr<Object> &object : m_objects)
@@ -119,6 +128,36 @@ void BusConnection::watchNames(std::function<void(const QString &, const QString
         this, nullptr);
 }
 
+void BusConnection::call(const Method &method, GVariant *arguments,
+                         std::function<void(const Variant &, const GError *)> handler) const
+{
+    using Handler = std::function<void(const Variant &, const GError *)>;
+    g_dbus_connection_call(
+        m_connection.get(), method.service.toUtf8().constData(), method.path.toUtf8().constData(),
+        method.interface.toUtf8().constData(), method.name.toUtf8().constData(), arguments, nullptr,
+        G_DBUS_CALL_FLAGS_NONE, -1, m_lifetime.get(),
+        [](GObject *connection, GAsyncResult *result, gpointer data) {
+            const std::unique_ptr<Handler> called(static_cast<Handler *>(data));
+            ErrorSlot error;
+            const Variant reply(g_dbus_connection_call_finish(G_DBUS_CONNECTION(connection), result, &error));
+            if (!g_error_matches(error.get(), G_IO_ERROR, G_IO_ERROR_CANCELLED))
+                (*called)(reply, error.get());
+        },
+        new Handler(std::move(handler)));
+}
+
+void BusConnection::watchSignal(const QString &service, const QString &member,
+                                std::function<void(const QString &)> handler)
+{
+    m_signalHandler = std::move(handler);
+    m_signalSubscription = g_dbus_connection_signal_subscribe(
+        m_connection.get(), service.toUtf8().constData(), nullptr, member.toUtf8().constData(), nullptr,
+        nullptr, G_DBUS_SIGNAL_FLAGS_NONE,
+        [](GDBusConnection *, const gchar *, const gchar *path, const gchar *, const gchar *, GVariant *,
+           gpointer data) { static_cast<BusConnection *>(data)->m_signalHandler(QString::fromUtf8(path)); },
+        this, nullptr);
+}
+
 void BusConnection::addObject(const QString &path, const QString &interface, MethodHandlers handlers)
 {
     static const GDBusInterfaceVTable vtable = {
@@ -129,8 +168,7 @@ void BusConnection::addObject(const QString &path, const QString &interface, Met
             try {
                 object->handlers.at(QString::fromUtf8(member))(call);
             } catch (const MethodError &error) {
-                g_dbus_method_invocation_return_dbus_error(invocation, error.name().toUtf8().constData(),
-                                                           error.what());
+                call.fail(error);
             }
         },
         nullptr,

@@ -57,6 +57,8 @@ public:
 
     /** Answers with @p values, a tuple of the contract's type, or with nothing. */
     void reply(GVariant *values = nullptr);
+    /** Answers with an error: for handlers that keep the call, and can throw no more. */
+    void fail(const MethodError &error);
 
 private:
     GDBusMethodInvocation *m_invocation;
@@ -83,6 +85,23 @@ public:
     /** @p handler learns of every name that gets or loses its owner; none is missed from here on. */
     void watchNames(std::function<void(const QString &name, const QString &newOwner)> handler);
 
+    /** Where a method is, for call(). */
+    struct Method {
+        QString service;
+        QString path;
+        QString interface;
+        QString name;
+    };
+    /**
+     * Calls @p method, and @p handler with its answer: null, and the error, when there is none. It is not
+     * called any more once this connection is destroyed.
+     */
+    void call(const Method &method, GVariant *arguments,
+              std::function<void(const Variant &reply, const GError *error)> handler) const;
+    /** @p handler learns of every signal of @p member that @p service emits. */
+    void watchSignal(const QString &service, const QString &member,
+                     std::function<void(const QString &path)> handler);
+
     /** Offers @p interface at @p path; each method of its contract has a handler. */
     void addObject(const QString &path, const QString &interface, MethodHandlers handlers);
     void removeObject(const QString &path, const QString &interface);
@@ -105,6 +124,9 @@ private:
     std::vector<std::unique_ptr<Object>> m_objects;
     std::function<void(const QString &, const QString &)> m_nameHandler;
     guint m_nameSubscription = 0;
+    std::function<void(const QString &)> m_signalHandler;
+    guint m_signalSubscription = 0;
+    GObjectPointer<GCancellable> m_lifetime; ///< ends the calls that wait for an answer
 };
 
 } // namespace Simulator

@@ -3,6 +3,7 @@
 
 #include "controlnames.h"
 #include "refusal.h"
+#include "service.h"
 
 #include <QtCore/QJsonDocument>
 #include <QtCore/QStringList>
@@ -24,9 +25,20 @@ GVariant *stringTuple(const QString &text)
     return g_variant_new("(s)", text.toUtf8().constData());
 }
 
+PhoneService::Done answerWhenDone(const MethodCall &call)
+{
+    return [call](const QString &problem) {
+        MethodCall waiting = call;
+        if (problem.isEmpty())
+            waiting.reply();
+        else
+            waiting.fail(Refusal(problem));
+    };
+}
+
 } // namespace
 
-Control::Control(std::vector<std::unique_ptr<Service>> &services, Journal &journal, FaultTable &faults,
+Control::Control(std::vector<std::unique_ptr<PhoneService>> &services, Journal &journal, FaultTable &faults,
                  const QJsonObject &identity)
     : m_services(services)
     , m_journal(journal)
@@ -42,19 +54,19 @@ Control::Control(std::vector<std::unique_ptr<Service>> &services, Journal &journ
              }},
             {QStringLiteral("StopService"),
              [this](MethodCall &call) {
-                 service(call.text(0)).stop();
-                 call.reply();
+                 service(call.text(0)).stop(answerWhenDone(call));
              }},
             {QStringLiteral("StartService"),
              [this](MethodCall &call) {
-                 Service &stopped = service(call.text(0));
-                 if (!stopped.isRunning())
-                     stopped.start();
-                 call.reply();
+                 PhoneService &stopped = service(call.text(0));
+                 if (stopped.isRunning())
+                     call.reply();
+                 else
+                     stopped.start(answerWhenDone(call));
              }},
             {QStringLiteral("SetFault"),
              [this](MethodCall &call) {
-                 const QString name = service(call.text(0)).name();
+                 const QString name = simulatedService(call.text(0)).name();
                  const Variant options(g_variant_get_child_value(call.arguments(), 5));
                  const quint32 id = m_faults.add(name, call.text(1), call.text(2), call.text(3), call.text(4),
                                                  options.get());
@@ -121,23 +133,31 @@ Control::Control(std::vector<std::unique_ptr<Service>> &services, Journal &journ
     m_connection.ownName(serviceName);
 }
 
-Service &Control::service(const QString &name) const
+PhoneService &Control::service(const QString &name) const
 {
     QStringList known;
-    for (const std::unique_ptr<Service> &each : m_services) {
+    for (const std::unique_ptr<PhoneService> &each : m_services) {
         if (each->name() == name)
             return *each;
         known << each->name();
     }
-    throw Refusal(QStringLiteral("There is no simulated service \"%1\"; there are %2")
+    throw Refusal(QStringLiteral("There is no service \"%1\"; there are %2")
                       .arg(name, known.join(QStringLiteral(", "))));
+}
+
+Service &Control::simulatedService(const QString &name) const
+{
+    if (Service *simulated = service(name).simulated())
+        return *simulated;
+    throw Refusal(
+        QStringLiteral("%1 is a real daemon's: it can only be stopped, started and acted upon").arg(name));
 }
 
 GVariant *Control::describeServices() const
 {
     GVariantBuilder services;
     g_variant_builder_init(&services, G_VARIANT_TYPE("a(sb)"));
-    for (const std::unique_ptr<Service> &each : m_services)
+    for (const std::unique_ptr<PhoneService> &each : m_services)
         g_variant_builder_add(&services, "(sb)", each->name().toUtf8().constData(),
                               gboolean(each->isRunning()));
     return g_variant_new("(a(sb))", &services);
@@ -145,7 +165,7 @@ GVariant *Control::describeServices() const
 
 void Control::emitServiceSignal(MethodCall &call) const
 {
-    const Service &emitter = service(call.text(0));
+    const Service &emitter = simulatedService(call.text(0));
     const QString path = call.text(1);
     const QString interface = call.text(2);
     const QString member = call.text(3);
@@ -173,7 +193,7 @@ GVariant *Control::describeActions() const
 {
     GVariantBuilder actions;
     g_variant_builder_init(&actions, G_VARIANT_TYPE("a(sss)"));
-    for (const std::unique_ptr<Service> &each : m_services) {
+    for (const std::unique_ptr<PhoneService> &each : m_services) {
         for (const std::unique_ptr<Component> &component : each->components()) {
             for (const Action &action : component->actions()) {
                 g_variant_builder_add(&actions, "(sss)", action.name.toUtf8().constData(),
@@ -188,7 +208,7 @@ GVariant *Control::describeActions() const
 QString Control::act(const QString &name, const QStringList &arguments) const
 {
     QStringList known;
-    for (const std::unique_ptr<Service> &each : m_services) {
+    for (const std::unique_ptr<PhoneService> &each : m_services) {
         for (const std::unique_ptr<Component> &component : each->components()) {
             for (const Action &action : component->actions()) {
                 known << action.name;
@@ -211,7 +231,7 @@ QString Control::act(const QString &name, const QStringList &arguments) const
 QString Control::state() const
 {
     QJsonObject state = m_identity;
-    for (const std::unique_ptr<Service> &each : m_services) {
+    for (const std::unique_ptr<PhoneService> &each : m_services) {
         for (const std::unique_ptr<Component> &component : each->components())
             component->describe(state);
     }

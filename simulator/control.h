@@ -5,7 +5,7 @@
 #include "busconnection.h"
 #include "faults.h"
 #include "journal.h"
-#include "service.h"
+#include "phoneservice.h"
 
 #include <QtCore/QJsonObject>
 
@@ -22,18 +22,20 @@ class Control
 {
 public:
     /** @p identity is what State() tells of the phone itself, beside its parts. */
-    Control(std::vector<std::unique_ptr<Service>> &services, Journal &journal, FaultTable &faults,
+    Control(std::vector<std::unique_ptr<PhoneService>> &services, Journal &journal, FaultTable &faults,
             const QJsonObject &identity);
 
 private:
-    Service &service(const QString &name) const;
+    PhoneService &service(const QString &name) const;
+    /** The service called @p name, which is refused when it is a real daemon. */
+    Service &simulatedService(const QString &name) const;
     GVariant *describeServices() const;
     void emitServiceSignal(MethodCall &call) const;
     GVariant *describeActions() const;
     QString act(const QString &name, const QStringList &arguments) const;
     QString state() const;
 
-    std::vector<std::unique_ptr<Service>> &m_services;
+    std::vector<std::unique_ptr<PhoneService>> &m_services;
     Journal &m_journal;
     FaultTable &m_faults;
     const QJsonObject m_identity;

@@ -3,6 +3,7 @@
 
 #include "component.h"
 #include "control.h"
+#include "realservice.h"
 #include "service.h"
 
 #include <glib-unix.h>
@@ -19,11 +20,12 @@ namespace Simulator
 namespace
 {
 
-std::vector<std::unique_ptr<Service>> createServices(const QJsonObject &profile,
-                                                     const QStringList &replacedNames, Phone &phone,
-                                                     Journal &journal, FaultTable &faults)
+using Services = std::vector<std::unique_ptr<PhoneService>>;
+
+Services createServices(const QJsonObject &profile, const QStringList &replacedNames, Phone &phone,
+                        Journal &journal, FaultTable &faults)
 {
-    std::vector<std::unique_ptr<Service>> services;
+    Services services;
     for (const ComponentType &type : ComponentRegistration::all()) {
         if (replacedNames.contains(type.service))
             continue;
@@ -35,10 +37,43 @@ std::vector<std::unique_ptr<Service>> createServices(const QJsonObject &profile,
     return services;
 }
 
+/** Starts the services one after the other. */
+class StartUp
+{
+public:
+    /** @p done is called when all are there, or with the problem of the first that is not. */
+    StartUp(const Services &services, PhoneService::Done done)
+        : m_services(services)
+        , m_done(std::move(done))
+    {
+        startNext();
+    }
+
+private:
+    void startNext()
+    {
+        if (m_next == m_services.size()) {
+            m_done(QString());
+            return;
+        }
+        m_services[m_next++]->start([this](const QString &problem) {
+            if (problem.isEmpty())
+                startNext();
+            else
+                m_done(problem);
+        });
+    }
+
+    const Services &m_services;
+    const PhoneService::Done m_done;
+    std::size_t m_next = 0;
+};
+
 } // namespace
 
-int runDevice(const QJsonObject &profile, const QStringList &replacedNames, int readyFd)
+int runDevice(const QJsonObject &profile, const std::vector<RealDaemon> &daemons, int readyFd)
 {
+    int status = 0;
     try {
         const GMainLoopPointer loop(g_main_loop_new(nullptr, FALSE));
         const guint termination = g_unix_signal_add(
@@ -52,35 +87,33 @@ int runDevice(const QJsonObject &profile, const QStringList &replacedNames, int 
         Journal journal;
         FaultTable faults;
         Phone phone(profile);
-        auto services = createServices(profile, replacedNames, phone, journal, faults);
+        QStringList replacedNames;
+        for (const RealDaemon &daemon : daemons)
+            replacedNames << daemon.busNames;
+        Services services = createServices(profile, replacedNames, phone, journal, faults);
+        for (const RealDaemon &daemon : daemons)
+            services.push_back(std::make_unique<RealService>(daemon, phone, [&status] { status = 1; }));
         const Control control(services, journal, faults,
                               {{QStringLiteral("name"), profile.value(QLatin1String("name"))}});
-        for (const std::unique_ptr<Service> &service : services)
-            service->start();
-
-        BusConnection observer;
-        const auto tellWhenReady = [&] {
-            for (const QString &name : replacedNames) {
-                if (readyFd < 0 || !observer.nameHasOwner(name))
-                    return;
+        const StartUp startUp(services, [&](const QString &problem) {
+            if (problem.isEmpty()) {
+                if (write(readyFd, "", 1) == 1)
+                    close(std::exchange(readyFd, -1));
+                return;
             }
-            if (write(readyFd, "", 1) == 1)
-                close(std::exchange(readyFd, -1));
-        };
-        observer.watchNames([&](const QString &, const QString &) {
-            if (readyFd >= 0)
-                tellWhenReady();
+            std::fprintf(stderr, "corvane-simulator: %s\n", qUtf8Printable(problem));
+            status = 1;
+            g_main_loop_quit(loop.get());
         });
-        tellWhenReady();
-
-        g_main_loop_run(loop.get());
+        if (status == 0)
+            g_main_loop_run(loop.get());
         services.clear();
         g_source_remove(termination);
     } catch (const BusError &error) {
         std::fprintf(stderr, "corvane-simulator: the phone's services: %s\n", error.what());
         return 1;
     }
-    return 0;
+    return status;
 }
 
 } // namespace Simulator

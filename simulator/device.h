@@ -2,8 +2,9 @@
 #ifndef CORVANE_SIMULATOR_DEVICE_H
 #define CORVANE_SIMULATOR_DEVICE_H
 
+#include "realdaemons.h"
+
 #include <QtCore/QJsonObject>
-#include <QtCore/QStringList>
 
 namespace Corvane
 {
@@ -14,12 +15,11 @@ namespace Simulator
  * Runs the simulated services until SIGTERM. Call it in a process of its own, inside the phone, once the bus
  * is there.
  *
- * @param replacedNames bus names that real daemons own in place of the simulated services; they are waited
- * for
- * @param readyFd closed after one byte when every name is on the bus
+ * @param daemons run in place of the simulated services whose names they own
+ * @param readyFd closed after one byte when all services can be used
  * @return the exit status of the process
  */
-int runDevice(const QJsonObject &profile, const QStringList &replacedNames, int readyFd);
+int runDevice(const QJsonObject &profile, const std::vector<RealDaemon> &daemons, int readyFd);
 
 } // namespace Simulator
 } // namespace Corvane

@@ -1,10 +1,42 @@
 // SPDX-License-Identifier: LGPL-2.1-or-later
 #include "realdaemons.h"
 
+#include "atmodem/emulatedmodems.h"
+
 namespace Corvane
 {
 namespace Simulator
 {
+
+namespace
+{
+
+std::unique_ptr<DaemonHardware> createModems(Phone &phone)
+{
+    return std::make_unique<EmulatedModems>(phone);
+}
+
+RealDaemon stockOfono(const QString &name)
+{
+    return {
+        name,
+        {QStringLiteral("org.ofono")},
+        {"/usr/sbin/ofonod", "-n"},
+        "ofono",
+        {"/var/lib/ofono"},
+        {},
+        createModems,
+    };
+}
+
+RealDaemon ofonoWithOurPlugin()
+{
+    RealDaemon ofono = stockOfono(QStringLiteral("ofono"));
+    ofono.additions = {{"/usr/lib/ofono/plugins/veldmobile.so", "../lib/ofono/plugins/veldmobile.so"}};
+    return ofono;
+}
+
+} // namespace
 
 std::string RealDaemon::logFile() const
 {
@@ -13,15 +45,8 @@ std::string RealDaemon::logFile() const
 
 const std::vector<RealDaemon> &realDaemons()
 {
-    static const std::vector<RealDaemon> daemons{
-        {
-            QStringLiteral("ofono"),
-            {QStringLiteral("org.ofono")},
-            {"/usr/sbin/ofonod", "-n"},
-            "ofono",
-            {"/var/lib/ofono"},
-        },
-    };
+    static const std::vector<RealDaemon> daemons{ofonoWithOurPlugin(),
+                                                 stockOfono(QStringLiteral("stock-ofono"))};
     return daemons;
 }
 

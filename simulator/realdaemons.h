@@ -2,9 +2,14 @@
 #ifndef CORVANE_SIMULATOR_REALDAEMONS_H
 #define CORVANE_SIMULATOR_REALDAEMONS_H
 
+#include "daemonhardware.h"
+
 #include <QtCore/QString>
 #include <QtCore/QStringList>
 
+#include <functional>
+#include <map>
+#include <memory>
 #include <string>
 #include <vector>
 
@@ -16,10 +21,14 @@ namespace Simulator
 /** A daemon of the distribution that can run in the phone in place of simulated services. */
 struct RealDaemon {
     QString name; ///< as on the command line
-    QStringList busNames; ///< which it owns; it is ready when it has them all
+    QStringList busNames; ///< which it owns; it is started and stopped by the name of the first
     std::vector<std::string> command; ///< the program's absolute path and its arguments
     std::string package; ///< of Debian
     std::vector<std::string> folders; ///< that it writes to, below /etc, /usr or /var
+    /** What of ours it loads: absolute paths in the phone, and where that lies, seen from the simulator. */
+    std::map<std::string, std::string> additions;
+    /** What it drives. */
+    std::function<std::unique_ptr<DaemonHardware>(Phone &phone)> createHardware;
 
     /** Where its output goes, in the phone. */
     std::string logFile() const;

@@ -9,7 +9,7 @@ namespace Simulator
 {
 
 Service::Service(const QString &name, Journal &journal, FaultTable &faults)
-    : m_name(name)
+    : PhoneService(name)
     , m_journal(journal)
     , m_faults(faults)
 {
@@ -20,40 +20,37 @@ Service::~Service()
     disconnect();
 }
 
-void Service::addComponent(std::unique_ptr<Component> component)
-{
-    m_components.push_back(std::move(component));
-}
-
-void Service::start()
+void Service::start(const Done &done)
 {
     m_connection = std::make_unique<BusConnection>();
-    Traffic::watch(m_connection->get(), m_name, m_journal, m_faults);
-    m_connection->watchNames([this](const QString &name, const QString &newOwner) {
-        if (!name.startsWith(QLatin1Char(':')) || !newOwner.isEmpty())
+    Traffic::watch(m_connection->get(), name(), m_journal, m_faults);
+    m_connection->watchNames([this](const QString &client, const QString &newOwner) {
+        if (!client.startsWith(QLatin1Char(':')) || !newOwner.isEmpty())
             return;
         for (const auto &handler : m_clientHandlers)
-            handler(name);
+            handler(client);
     });
-    for (const std::unique_ptr<Component> &component : m_components)
+    for (const std::unique_ptr<Component> &component : components())
         component->attach(*this);
     // The name comes last: who sees it finds all objects.
-    m_connection->ownName(m_name);
+    m_connection->ownName(name());
+    done(QString());
 }
 
-void Service::stop()
+void Service::stop(const Done &done)
 {
-    if (!isRunning())
-        return;
-    m_connection->releaseName(m_name);
-    disconnect();
+    if (isRunning()) {
+        m_connection->releaseName(name());
+        disconnect();
+    }
+    done(QString());
 }
 
 void Service::disconnect()
 {
     if (!isRunning())
         return;
-    for (const std::unique_ptr<Component> &component : m_components)
+    for (const std::unique_ptr<Component> &component : components())
         component->detach();
     m_clientHandlers.clear();
     m_connection.reset();

@@ -3,9 +3,9 @@
 #define CORVANE_SIMULATOR_SERVICE_H
 
 #include "busconnection.h"
-#include "component.h"
 #include "faults.h"
 #include "journal.h"
+#include "phoneservice.h"
 
 #include <QtCore/QString>
 
@@ -18,21 +18,18 @@ namespace Corvane
 namespace Simulator
 {
 
-/** A bus name of the phone with the components behind it; it can be stopped and started again. */
-class Service
+/** A simulated service: the components behind its name answer the calls. */
+class Service : public PhoneService
 {
 public:
     Service(const QString &name, Journal &journal, FaultTable &faults);
-    ~Service();
+    ~Service() override;
 
-    QString name() const { return m_name; }
-    void addComponent(std::unique_ptr<Component> component);
-    const std::vector<std::unique_ptr<Component>> &components() const { return m_components; }
-
-    bool isRunning() const { return m_connection != nullptr; }
-    void start();
-    /** Returns when the name has left the bus; calls that wait for an answer get none. */
-    void stop();
+    bool isRunning() const override { return m_connection != nullptr; }
+    Service *simulated() override { return this; }
+    /** Done at once; throws BusError. */
+    void start(const Done &done) override;
+    void stop(const Done &done) override;
 
     /** For components while they are attached. */
     void addObject(const QString &path, const QString &interface, MethodHandlers handlers);
@@ -47,10 +44,8 @@ public:
 private:
     void disconnect();
 
-    const QString m_name;
     Journal &m_journal;
     FaultTable &m_faults;
-    std::vector<std::unique_ptr<Component>> m_components;
     std::vector<std::function<void(const QString &)>> m_clientHandlers;
     std::unique_ptr<BusConnection> m_connection;
 };

@@ -3,6 +3,7 @@
 
 #include "busconnection.h"
 #include "device.h"
+#include "logtail.h"
 #include "sandbox.h"
 
 #include <QtCore/QCryptographicHash>
@@ -35,6 +36,7 @@ namespace
 {
 
 constexpr int readinessTimeout = 20000; // ms; a loaded machine may take seconds
+constexpr int daemonsTimeout = 120000; // ms; those who start them give up earlier, and say more
 constexpr int farewellTimeout = 5000; // ms
 
 const std::string busConfigurationFile = "/run/corvane-simulator/bus.conf";
@@ -95,16 +97,15 @@ private:
     int m_ends[2] = {-1, -1};
 };
 
-/** The last line of a daemon's log, which dies with the phone. */
-std::string lastLine(const std::string &fileName)
+std::string contentOf(const std::string &fileName)
 {
-    std::ifstream file(fileName);
-    std::string last;
-    for (std::string line; std::getline(file, line);) {
-        if (!line.empty())
-            last = line;
-    }
-    return last;
+    std::ifstream file(fileName, std::ios::binary);
+    std::ostringstream content;
+    content << file.rdbuf();
+    if (!file)
+        throw SetUpError::fromErrno("cannot read " + fileName,
+                                    "it belongs to what --real wants; build or install it");
+    return content.str();
 }
 
 void redirect(const std::string &fileName, int flags, int fd)
@@ -166,8 +167,8 @@ private:
     void startCommand();
 
     /** Waits for the first byte from the other end of @p pipe. */
-    void waitUntilReady(Pipe &pipe, const std::string &what, const std::vector<std::string> &logFiles);
-    static std::string lastWords(const std::vector<std::string> &logFiles);
+    void waitUntilReady(Pipe &pipe, const std::string &what, const std::string &logFile, int timeout);
+    static std::string lastWords(const std::string &logFile);
     signalfd_siginfo readSignal() const;
     void reapChildren();
     int waitForCommand();
@@ -212,9 +213,12 @@ PhoneFiles Supervisor::phoneFiles() const
               .toHex()
               .toStdString()
         + "\n";
-    for (const RealDaemon &daemon : m_settings.realDaemons)
+    for (const RealDaemon &daemon : m_settings.realDaemons) {
         phone.writableFolders.insert(phone.writableFolders.end(), daemon.folders.begin(),
                                      daemon.folders.end());
+        for (const auto &[path, origin] : daemon.additions)
+            phone.files[path] = contentOf(m_programFolder + "/" + origin);
+    }
     return phone;
 }
 
@@ -321,31 +325,20 @@ void Supervisor::startBus()
                  {"dbus-daemon", "--nofork", "--nopidfile", "--config-file=" + busConfigurationFile,
                   "--print-address=" + std::to_string(address.writer())},
                  busLogFile, address.writer());
-    waitUntilReady(address, "the phone's system bus", {busLogFile});
+    waitUntilReady(address, "the phone's system bus", busLogFile, readinessTimeout);
 }
 
 Supervisor::ForkedStatus Supervisor::startDevice()
 {
-    QStringList replacedNames;
-    std::vector<std::string> logFiles;
-    for (const RealDaemon &daemon : m_settings.realDaemons) {
-        startProgram(daemon.command.front(), daemon.command, daemon.logFile());
-        replacedNames << daemon.busNames;
-        logFiles.push_back(daemon.logFile());
-    }
-
     Pipe readiness;
     m_device = forkChild("the phone's services");
     if (m_device == 0) {
         becomeService();
-        return runDevice(m_settings.profile.object, replacedNames, readiness.releaseWriter());
+        return runDevice(m_settings.profile.object, m_settings.realDaemons, readiness.releaseWriter());
     }
     m_services[m_device] = "the phone's services";
-    waitUntilReady(readiness,
-                   replacedNames.isEmpty()
-                       ? "the set of the phone's services"
-                       : "bus name " + replacedNames.join(QLatin1String(", ")).toStdString(),
-                   logFiles);
+    waitUntilReady(readiness, "the set of the phone's services", {},
+                   m_settings.realDaemons.empty() ? readinessTimeout : daemonsTimeout);
     return std::nullopt;
 }
 
@@ -370,33 +363,28 @@ void Supervisor::startCommand()
     }
 }
 
-std::string Supervisor::lastWords(const std::vector<std::string> &logFiles)
+std::string Supervisor::lastWords(const std::string &logFile)
 {
-    std::string words;
-    for (const std::string &logFile : logFiles) {
-        const std::string line = lastLine(logFile);
-        if (!line.empty())
-            words += "; " + std::filesystem::path(logFile).stem().string() + " said: " + line;
-    }
-    return words;
+    const std::string tail = logFile.empty() ? std::string() : logTail(logFile);
+    return tail.empty() ? std::string() : "; it said:\n" + tail;
 }
 
-void Supervisor::waitUntilReady(Pipe &pipe, const std::string &what, const std::vector<std::string> &logFiles)
+void Supervisor::waitUntilReady(Pipe &pipe, const std::string &what, const std::string &logFile, int timeout)
 {
     pipe.closeWriter();
     pollfd polled[] = {{m_signalFd, POLLIN, 0}, {pipe.reader(), POLLIN, 0}};
     for (;;) {
-        const int count = poll(polled, 2, readinessTimeout);
+        const int count = poll(polled, 2, timeout);
         if (count == 0)
-            throw SetUpError(what + " is not there after " + std::to_string(readinessTimeout / 1000) + " s"
-                             + lastWords(logFiles));
+            throw SetUpError(what + " is not there after " + std::to_string(timeout / 1000) + " s"
+                             + lastWords(logFile));
         if (polled[0].revents) {
             const signalfd_siginfo signal = readSignal();
             if (signal.ssi_signo != SIGCHLD)
                 throw Interruption{int(signal.ssi_signo)};
             reapChildren();
             if (!m_failure.empty())
-                throw SetUpError(m_failure + lastWords(logFiles));
+                throw SetUpError(m_failure + lastWords(logFile));
         }
         if (polled[1].revents) {
             char byte = 0;

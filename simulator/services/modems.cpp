@@ -5,9 +5,9 @@
 #include "ofono.h"
 #include "refusal.h"
 #include "service.h"
+#include "simtray.h"
 
 #include <QtCore/QJsonArray>
-#include <QtCore/QRegularExpression>
 #include <QtCore/QSet>
 
 #include <algorithm>
@@ -68,10 +68,7 @@ public:
     std::vector<Action> actions() override;
 
 private:
-    std::size_t slot(const QString &text) const;
     void announce();
-    QString pullSim(const QString &slotText);
-    QString insertSim(const QStringList &arguments);
     QString lockSim(const QStringList &arguments);
     QString changeSim(const QString &slotText, const std::function<void(Sim &)> &change);
     QString chooseSim(const QStringList &arguments);
@@ -80,6 +77,7 @@ private:
     QString setRegistration(const QStringList &arguments);
 
     Phone &m_phone;
+    const SimTray m_tray;
     ModemList m_modems; ///< by slot
     ModemManager m_manager;
     Service *m_service = nullptr;
@@ -98,6 +96,7 @@ ModemList createModems(const QJsonObject &profile, const Phone &phone, const std
 
 Modems::Modems(const QJsonObject &profile, Phone &phone)
     : m_phone(phone)
+    , m_tray(phone, [this](std::size_t) { announce(); })
     , m_modems(createModems(profile, phone, [this] { announce(); }))
     , m_manager(m_modems, profile.value(QLatin1String("telephony")).toObject(), [this] { announce(); })
 {
@@ -148,18 +147,7 @@ void Modems::announce()
 
 void Modems::describe(QJsonObject &state) const
 {
-    QJsonArray sims;
-    for (const Sim &sim : m_phone.sims) {
-        sims << QJsonObject{
-            {QStringLiteral("imsi"), sim.imsi},
-            {QStringLiteral("iccid"), sim.iccid},
-            {QStringLiteral("provider"), sim.provider},
-            {QStringLiteral("numbers"), QJsonArray::fromStringList(sim.numbers)},
-            {QStringLiteral("present"), sim.present},
-            {QStringLiteral("pin"), sim.pin},
-        };
-    }
-    state.insert(QStringLiteral("sims"), sims);
+    state.insert(QStringLiteral("sims"), m_tray.describe());
 
     QJsonArray modems;
     for (const std::unique_ptr<Modem> &modem : m_modems)
@@ -168,59 +156,12 @@ void Modems::describe(QJsonObject &state) const
     state.insert(QStringLiteral("telephony"), m_manager.describe());
 }
 
-std::size_t Modems::slot(const QString &text) const
-{
-    if (const std::optional<std::size_t> slot = m_phone.slotNumbered(text))
-        return *slot;
-    throw Refusal(QStringLiteral("There is no SIM slot \"%1\"; the phone has %2, numbered from 0")
-                      .arg(text)
-                      .arg(m_phone.sims.size()));
-}
-
-QString Modems::pullSim(const QString &slotText)
-{
-    const std::size_t index = slot(slotText);
-    Sim &sim = m_phone.sims[index];
-    if (!sim.present)
-        throw Refusal(QStringLiteral("There is no SIM in slot %1").arg(index));
-    sim.present = false;
-    announce();
-    return QStringLiteral("The SIM %1 is out of slot %2").arg(sim.imsi).arg(index);
-}
-
-QString Modems::insertSim(const QStringList &arguments)
-{
-    static const QRegularExpression imsiDigits(QStringLiteral("\\A[0-9]{6,15}\\z"));
-    const std::size_t index = slot(arguments.first());
-    Sim &sim = m_phone.sims[index];
-    if (sim.present)
-        throw Refusal(QStringLiteral("There is a SIM in slot %1; pull it first").arg(index));
-    const QString imsi = arguments.size() > 1 ? arguments.at(1) : sim.imsi;
-    if (!imsiDigits.match(imsi).hasMatch()) {
-        throw Refusal(imsi.isEmpty()
-                          ? QStringLiteral("Slot %1 never had a SIM; name the IMSI of the new one").arg(index)
-                          : QStringLiteral("\"%1\" is no IMSI; it has 6 to 15 digits").arg(imsi));
-    }
-    const bool elsewhere = std::any_of(m_phone.sims.begin(), m_phone.sims.end(),
-                                       [&](const Sim &other) { return other.present && other.imsi == imsi; });
-    if (elsewhere)
-        throw Refusal(QStringLiteral("The SIM %1 is in another slot; pull it there first").arg(imsi));
-
-    if (imsi != sim.imsi)
-        sim = m_phone.cardWithImsi(imsi);
-    sim.present = true;
-    announce();
-    return QStringLiteral("The SIM %1 is in slot %2").arg(imsi).arg(index);
-}
-
 QString Modems::lockSim(const QStringList &arguments)
 {
-    const std::size_t index = slot(arguments.at(0));
+    const std::size_t index = m_tray.slot(arguments.at(0));
     const QString pin = arguments.at(1);
     checkWord(pin, pinStates());
-    Sim &sim = m_phone.sims[index];
-    if (!sim.present)
-        throw Refusal(QStringLiteral("There is no SIM in slot %1; insert one").arg(index));
+    Sim &sim = m_tray.card(index);
     const bool wasUsable = sim.isUsable();
     sim.pin = pin;
     if (wasUsable && !sim.isUsable()) {
@@ -235,7 +176,7 @@ QString Modems::lockSim(const QStringList &arguments)
 
 QString Modems::changeSim(const QString &slotText, const std::function<void(Sim &)> &change)
 {
-    change(m_phone.sims[slot(slotText)]);
+    change(m_phone.sims[m_tray.slot(slotText)]);
     announce();
     return QString();
 }
@@ -243,7 +184,7 @@ QString Modems::changeSim(const QString &slotText, const std::function<void(Sim 
 QString Modems::chooseSim(const QStringList &arguments)
 {
     checkWord(arguments.at(0), {QStringLiteral("voice"), QStringLiteral("data")});
-    const std::size_t index = slot(arguments.at(1));
+    const std::size_t index = m_tray.slot(arguments.at(1));
     const Sim &sim = m_phone.sims[index];
     if (!sim.isUsable())
         throw Refusal(QStringLiteral("There is no SIM in slot %1 that could be used").arg(index));
@@ -257,7 +198,7 @@ QString Modems::chooseSim(const QStringList &arguments)
 
 QString Modems::setModemThere(const QString &slotText, bool isThere)
 {
-    const std::size_t index = slot(slotText);
+    const std::size_t index = m_tray.slot(slotText);
     Modem &modem = *m_modems[index];
     if (modem.isThere() == isThere) {
         throw Refusal(isThere ? QStringLiteral("The modem of slot %1 is there").arg(index)
@@ -280,14 +221,14 @@ QString Modems::setModemThere(const QString &slotText, bool isThere)
 
 QString Modems::setModemEnabled(const QString &slotText, bool enabled)
 {
-    m_modems[slot(slotText)]->setEnabled(enabled);
+    m_modems[m_tray.slot(slotText)]->setEnabled(enabled);
     announce();
     return QString();
 }
 
 QString Modems::setRegistration(const QStringList &arguments)
 {
-    const std::size_t index = slot(arguments.at(0));
+    const std::size_t index = m_tray.slot(arguments.at(0));
     checkWord(arguments.at(1), registrationStates());
     m_modems[index]->setRegistration(arguments.at(1));
     announce();
@@ -296,17 +237,8 @@ QString Modems::setRegistration(const QStringList &arguments)
 
 std::vector<Action> Modems::actions()
 {
-    return {
-        {QStringLiteral("sim pull"), QStringLiteral("SLOT"), QStringLiteral("takes the SIM out of a slot"), 1,
-         1,
-         [this](const QStringList &arguments) {
-             return pullSim(arguments.first());
-         }},
-        {QStringLiteral("sim insert"), QStringLiteral("SLOT [IMSI]"),
-         QStringLiteral("puts the SIM back, or another one in its place"), 1, 2,
-         [this](const QStringList &arguments) {
-             return insertSim(arguments);
-         }},
+    std::vector<Action> actions = m_tray.actions();
+    const std::vector<Action> own{
         {QStringLiteral("sim lock"), QStringLiteral("SLOT PIN-STATE"),
          QStringLiteral("makes the SIM require a PIN (pin), an unblocking key (puk)... or none"), 2, 2,
          [this](const QStringList &arguments) {
@@ -370,6 +302,8 @@ std::vector<Action> Modems::actions()
              return QString();
          }},
     };
+    actions.insert(actions.end(), own.begin(), own.end());
+    return actions;
 }
 
 QString problemOf(const QJsonObject &profile)

@@ -63,6 +63,12 @@ void MdmctlUsageTest::helpTeachesAtEachLevel_data()
                                             QStringLiteral("--timeout SECONDS"), QStringLiteral("Examples:"),
                                             QStringLiteral("JSON"), QStringLiteral("Exit status: 0 done")};
     QTest::newRow("optional") << "update download" << QStringList{QStringLiteral("[OPTIONS] [VERSION]")};
+    QTest::newRow("family without directions")
+        << "data set"
+        << QStringList{QStringLiteral("mdmctl data set [OPTIONS] IMSI=ACTION..."),
+                       QStringLiteral("mdmctl data set 244")};
+    QTest::newRow("search") << "call-statistics search"
+                            << QStringList{QStringLiteral("--from TIME"), QStringLiteral("\"results\"")};
     QTest::newRow("several") << "calls set" << QStringList{QStringLiteral("DIR IMSI=ACTION...")};
 }
 
@@ -98,8 +104,8 @@ void MdmctlUsageTest::mistakesAreToldInOneLine_data()
         QTest::newRow(arguments) << QString::fromUtf8(message);
     };
     row("",
-        R"("mdmctl" needs a command: must be one of "update", "calls", "sim", "policy", )"
-        R"("completion")");
+        R"("mdmctl" needs a command: must be one of "update", "calls", "sms", "data", "sim", )"
+        R"("call-statistics", "policy", "completion")");
     row("calls --json",
         R"("mdmctl calls" needs a command: must be one of "show", "add", "remove", "set", "clear", )"
         R"("default", "watch")");
@@ -160,7 +166,7 @@ void MdmctlUsageTest::bashCompletes_data()
         QTest::newRow(line) << QString::fromUtf8(expected);
     };
     // A line that ends with a space has an empty word at the cursor.
-    row("mdmctl ", "update calls sim policy completion");
+    row("mdmctl ", "update calls sms data sim call-statistics policy completion");
     row("mdmctl sim ", "list watch imei imsi iccid numbers");
     row("mdmctl p", "policy");
     row("mdmctl calls ", "show add remove set clear default watch");
@@ -169,6 +175,8 @@ void MdmctlUsageTest::bashCompletes_data()
     row("mdmctl calls add --timeout 3 in", "incoming");
     row("mdmctl calls add --timeout ", "");
     row("mdmctl calls add dial --", "--json --timeout --help");
+    row("mdmctl sms add 24405 ", "block allow");
+    row("mdmctl call-statistics search --", "--first --second --from --to --json --timeout --help");
     row("mdmctl update install --w", "--wait");
     row("mdmctl policy check /etc/host", "/etc/host.conf /etc/hostname /etc/hosts");
     row("mdmctl completion ", "bash");

@@ -96,6 +96,8 @@ Client::Client()
 
 Client::~Client()
 {
+    // A call that is not answered must not outlive its connection.
+    qDeleteAll(findChildren<QDBusPendingCallWatcher *>());
     QDBusConnection::disconnectFromBus(m_connectionName);
 }
 

@@ -1,8 +1,11 @@
 // SPDX-License-Identifier: LGPL-2.1-or-later
 // Uses every public class from outside of the project. Where no service answers, it must work as well.
+#include <corvanemdm/callstatistics.h>
 #include <corvanemdm/corvanemdm_global.h>
 #include <corvanemdm/simfilter.h>
 #include <corvanemdm/siminfo.h>
+#include <corvanemdm/simmobiledatafilter.h>
+#include <corvanemdm/simsmsfilter.h>
 #include <corvanemdm/simvoicecallfilter.h>
 #include <corvanemdm/softwareupdate.h>
 
@@ -45,6 +48,25 @@ bool simVoiceCallFilterWorks()
     return !filter.ready() && filter.dialRules().isEmpty() && !filter.clearIncomingRules();
 }
 
+bool otherFiltersWork()
+{
+    SimSmsFilter texts;
+    QObject::connect(&texts, &SimSmsFilter::readyChanged, &texts, [] {});
+    SimMobileDataFilter data;
+    QObject::connect(&data, &SimMobileDataFilter::readyChanged, &data, [] {});
+    return !texts.ready() && !texts.clearTextRules() && !data.ready() && !data.clearRules();
+}
+
+bool callStatisticsWork()
+{
+    CallStatistics statistics;
+    int answers = 0;
+    QObject::connect(&statistics, &CallStatistics::searchFinished, &statistics,
+                     [&answers](bool, const QList<CallStatistics::Result> &) { ++answers; });
+    statistics.search(CallStatistics::Filter());
+    return answers == 0;
+}
+
 QString latestVersion()
 {
     const SoftwareUpdate update;
@@ -58,7 +80,8 @@ QString latestVersion()
 int main(int argc, char **argv)
 {
     QCoreApplication application(argc, argv);
-    const bool works = simFilterWorks() && simInfoWorks() && simVoiceCallFilterWorks();
+    const bool works = simFilterWorks() && simVoiceCallFilterWorks() && otherFiltersWork() && simInfoWorks()
+        && callStatisticsWork();
     QTextStream(stdout) << (works ? "consumer works" : "consumer fails") << ", update: " << latestVersion()
                         << '\n';
     return works ? 0 : 1;
