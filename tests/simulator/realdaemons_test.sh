@@ -10,9 +10,9 @@ expect() { # WHAT ACTUAL EXPECTED
     [[ $2 == "$3" ]] || { echo "FAIL: $1 is \"$2\", expected \"$3\""; failures=$((failures + 1)); }
 }
 
-expect "modems of the real oFono" \
-    "$("$simulator" --real stock-ofono -- gdbus call --system -d org.ofono -o / -m org.ofono.Manager.GetModems)" \
-    "(@a(oa{sv}) [],)"
+expect "modems of the real oFono that are online" \
+    "$("$simulator" --real stock-ofono -- gdbus call --system -d org.ofono -o / -m org.ofono.Manager.GetModems |
+        grep -o "'Online': <true>" | wc -l)" 2
 expect "services" "$("$simulator" --real ofono -- corvane-simctl services)" \
     "org.corvaneos.mdmproxy  running"$'\n'"org.ofono               running"
 expect "its log" "$("$simulator" --real ofono -- grep -c 'oFono version' /run/corvane-simulator/ofono.log)" 1
