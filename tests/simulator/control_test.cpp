@@ -206,7 +206,7 @@ void ControlTest::stopsAndStartsServices()
     const QString unknown
         = refused
         + QStringLiteral(
-              "There is no simulated service \"org.x\"; there are org.corvaneos.mdmproxy, org.ofono");
+              "There is no service \"org.x\"; there are org.corvaneos.mdmproxy, org.ofono");
     QCOMPARE(control(stop, {QStringLiteral("org.x")}), unknown);
     QCOMPARE(control(start, {QStringLiteral("org.x")}), unknown);
 }
@@ -357,7 +357,7 @@ void ControlTest::refusesWrongFaults_data()
         QTest::newRow(name) << arguments << QString::fromLatin1(sentence);
     };
     row("service", {text, QString(), QString(), QString(), never, QVariantMap()},
-        "There is no simulated service \"x\"; there are org.corvaneos.mdmproxy, org.ofono");
+        "There is no service \"x\"; there are org.corvaneos.mdmproxy, org.ofono");
     row("path", {ofono, text, QString(), QString(), never, QVariantMap()},
         "\"x\" is no object path; leave it empty to match all of them");
     row("interface", {ofono, QString(), text, QString(), never, QVariantMap()},
