@@ -203,10 +203,8 @@ void ControlTest::stopsAndStartsServices()
     QCOMPARE(control(start, {ofono}), done);
     QCOMPARE(filterCall(), all);
 
-    const QString unknown
-        = refused
-        + QStringLiteral(
-              "There is no service \"org.x\"; there are org.corvaneos.mdmproxy, org.ofono");
+    const QString unknown = refused
+        + QStringLiteral("There is no service \"org.x\"; there are org.corvaneos.mdmproxy, org.ofono");
     QCOMPARE(control(stop, {QStringLiteral("org.x")}), unknown);
     QCOMPARE(control(start, {QStringLiteral("org.x")}), unknown);
 }
