@@ -28,6 +28,20 @@ expect "services" "$("$simulator" --real ofono -- corvane-simctl services)" \
 org.ofono               running"
 expect "its log" "$("$simulator" --real ofono -- grep -c 'oFono version' /run/corvane-simulator/ofono.log)" 1
 
+# A daemon that dies by itself is told of, can be started again, and is not forgotten.
+status=0
+# shellcheck disable=SC2016
+text=$("$simulator" --real stock-ofono -- sh -c '
+    for process in /proc/[0-9]*; do
+        [ "$(readlink "$process/exe")" != /usr/sbin/ofonod ] || kill -9 "${process#/proc/}"
+    done
+    until corvane-simctl services | grep -q "org.ofono *stopped"; do :; done
+    corvane-simctl start org.ofono
+    corvane-simctl services' 2>&1) || status=$?
+expect "status with a daemon that dies" $status 125
+contains "message" "$text" "corvane-simulator: /usr/sbin/ofonod was ended by signal 9; stock-ofono said:"
+contains "services after that" "$text" "org.ofono               running"
+
 # In a phone the daemon can be taken away, by root, without anybody missing it.
 if [[ $EUID -eq 0 ]]; then
     status=0
