@@ -158,6 +158,9 @@ bool Client::waitForSignals(int count) const
 
 QStringList Client::takeSignals(const QString &service)
 {
+    // A service may signal on after it has answered: that is over when the phone answers, and taken in when
+    // the service has answered once more.
+    control(QStringLiteral("Services"));
     call(service, QStringLiteral("/"), QStringLiteral("org.freedesktop.DBus.Peer"), QStringLiteral("Ping"));
     return std::exchange(m_signals, {});
 }
