@@ -36,8 +36,6 @@ if(CORVANEMDM_SANITIZE)
     add_compile_options(-fsanitize=address,undefined -fno-sanitize-recover=all -fno-omit-frame-pointer -O1 -g1)
     # Instrumented, the standard library looks uninitialised to GCC; the plain build has the warning on.
     add_compile_options(-Wno-maybe-uninitialized)
-    # Any number can be passed in as an action, and what it means is laid down: no -fstrict-enums here.
-    add_compile_options(-fno-sanitize=enum)
     add_link_options(-fsanitize=address,undefined)
 else()
     add_link_options(-Wl,--no-undefined)

@@ -1,13 +1,14 @@
 # SPDX-License-Identifier: LGPL-2.1-or-later
 # The platform client libraries: each is either bundled, as part of libcorvanemdm-platform, or the device's own.
 
-# corvanemdm_platform_library(<name> SOURCES <file>... HEADERS <file>...)
+# corvanemdm_platform_library(<name> SOURCES <file>... HEADERS <file>... [MODULES <module>...])
 #
 # Declares the library <name> of this folder, and the cache variable CORVANEMDM_PLATFORM_<NAME> that chooses between
 # "bundled" (the default) and "system". "system" takes the pkg-config module CORVANEMDM_PLATFORM_<NAME>_MODULE, named as
-# the library by default. Users link the target corvanemdm-platform-<name>, which hides the choice from them.
+# the library by default. Users link the target corvanemdm-platform-<name>, which hides the choice from them. MODULES are
+# the pkg-config modules that the bundled library is built on.
 function(corvanemdm_platform_library name)
-    cmake_parse_arguments(PARSE_ARGV 1 arg "" "" "SOURCES;HEADERS")
+    cmake_parse_arguments(PARSE_ARGV 1 arg "" "" "SOURCES;HEADERS;MODULES")
     string(TOUPPER ${name} upper)
     set(choice CORVANEMDM_PLATFORM_${upper})
     set(${choice} bundled CACHE STRING "Where the platform library ${name} comes from")
@@ -29,6 +30,7 @@ function(corvanemdm_platform_library name)
         list(TRANSFORM arg_SOURCES PREPEND ${CMAKE_CURRENT_SOURCE_DIR}/)
         list(TRANSFORM arg_HEADERS PREPEND ${CMAKE_CURRENT_SOURCE_DIR}/)
         set_property(GLOBAL APPEND PROPERTY CORVANEMDM_PLATFORM_SOURCES ${arg_SOURCES} ${arg_HEADERS})
+        set_property(GLOBAL APPEND PROPERTY CORVANEMDM_PLATFORM_MODULES ${arg_MODULES})
         install(FILES ${arg_HEADERS} DESTINATION ${CMAKE_INSTALL_INCLUDEDIR}/corvanemdm-platform/${name})
     else()
         message(FATAL_ERROR "${choice} is '${${choice}}'; it must be 'bundled' or 'system'.")

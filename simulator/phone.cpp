@@ -8,6 +8,13 @@ namespace Corvane
 namespace Simulator
 {
 
+bool Sim::isUsable() const
+{
+    // A second PIN guards a few of the card's functions alone.
+    static const QStringList harmless{QStringLiteral("none"), QStringLiteral("pin2"), QStringLiteral("puk2")};
+    return present && harmless.contains(pin);
+}
+
 Sim Phone::cardWithImsi(const QString &imsi) const
 {
     const auto known = m_cards.find(imsi);
@@ -33,6 +40,7 @@ Phone::Phone(const QJsonObject &profile)
         sim.iccid = card.value(QLatin1String("iccid")).toString(sim.iccid);
         sim.provider = card.value(QLatin1String("provider")).toString(sim.provider);
         sim.present = card.value(QLatin1String("present")).toBool(sim.present);
+        sim.pin = card.value(QLatin1String("pin")).toString(sim.pin);
         const QJsonArray numbers = card.value(QLatin1String("numbers")).toArray();
         for (const QJsonValue &number : numbers)
             sim.numbers << number.toString();

@@ -22,6 +22,10 @@ struct Sim {
     QString provider;
     QStringList numbers;
     bool present = false;
+    QString pin = QStringLiteral("none"); ///< what it requires, in the telephony daemon's words
+
+    /** Whether the phone can read all of it and use it. */
+    bool isUsable() const;
 };
 
 /** What several services know of the phone. */

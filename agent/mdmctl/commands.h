@@ -10,9 +10,12 @@ namespace Corvane
 namespace Agent
 {
 
-// One a family, in a file of its own.
+// One a family; each in a file of its own, but for the families of rules.
 Command updateCommand();
 Command callsCommand();
+Command smsCommand();
+Command dataCommand();
+Command callStatisticsCommand();
 Command policyCommand();
 
 // Options that commands share.

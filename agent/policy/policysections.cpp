@@ -1,7 +1,7 @@
 // SPDX-License-Identifier: LGPL-2.1-or-later
 #include "policysections.h"
 
-#include "callsection.h"
+#include "rulesection.h"
 #include "softwareupdatesection.h"
 
 namespace Corvane
@@ -12,7 +12,8 @@ namespace Agent
 PolicySections makePolicySections(const Timeouts &timeouts)
 {
     PolicySections sections;
-    sections.push_back(std::make_unique<CallSection>(timeouts.confirmation));
+    for (const RuleFamily &family : {RuleFamily::calls(), RuleFamily::sms(), RuleFamily::data()})
+        sections.push_back(std::make_unique<RuleSection>(family, timeouts.confirmation));
     sections.push_back(std::make_unique<SoftwareUpdateSection>(timeouts.silence));
     return sections;
 }

@@ -13,7 +13,7 @@ namespace Agent
 namespace
 {
 
-const QLatin1String refusals(R"(^Method call failed: |GetAll\(\) failed: )");
+const QLatin1String refusals(R"(^Method call failed: |GetAll\(\) failed: |^search\(\) failed: )");
 
 QString seconds(std::chrono::milliseconds time)
 {

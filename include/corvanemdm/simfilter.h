@@ -25,8 +25,8 @@ class CORVANEMDM_EXPORT SimFilter : public QObject
     Q_OBJECT
 
 public:
-    /** What happens to the traffic. */
-    enum Action {
+    /** What happens to the traffic. Any other number is not an action; it is refused, or read as Block. */
+    enum Action : uint {
         Block = 1, ///< the traffic is refused
         Ignore = 1, ///< another name of Block
         Allow = 2, ///< the traffic is let through

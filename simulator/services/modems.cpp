@@ -1,5 +1,7 @@
 // SPDX-License-Identifier: LGPL-2.1-or-later
 #include "component.h"
+#include "modem.h"
+#include "modemmanager.h"
 #include "ofono.h"
 #include "refusal.h"
 #include "service.h"
@@ -20,237 +22,45 @@ namespace
 
 const QLatin1String managerPath("/");
 const QLatin1String managerInterface("org.ofono.Manager");
-const QLatin1String modemInterface("org.ofono.Modem");
-const QLatin1String simInterface("org.ofono.SimManager");
-const QLatin1String propertyChanged("PropertyChanged");
 
-const QLatin1String poweredProperty("Powered");
-const QLatin1String onlineProperty("Online");
-
-using Properties = std::vector<std::pair<QString, Variant>>;
-
-Variant fromText(const QString &text)
+// The words that the telephony daemon documents.
+const QStringList &pinStates()
 {
-    return Variant(g_variant_new_string(text.toUtf8().constData()));
-}
-
-Variant fromBool(bool value)
-{
-    return Variant(g_variant_new_boolean(value));
-}
-
-Variant fromList(const QStringList &list)
-{
-    GVariantBuilder strings;
-    g_variant_builder_init(&strings, G_VARIANT_TYPE_STRING_ARRAY);
-    for (const QString &string : list)
-        g_variant_builder_add(&strings, "s", string.toUtf8().constData());
-    return Variant(g_variant_builder_end(&strings));
-}
-
-GVariant *toVariant(const Properties &properties)
-{
-    GVariantBuilder map;
-    g_variant_builder_init(&map, G_VARIANT_TYPE_VARDICT);
-    for (const auto &[name, value] : properties)
-        g_variant_builder_add(&map, "{sv}", name.toUtf8().constData(), value.get());
-    return g_variant_builder_end(&map);
-}
-
-/** The modem of one SIM slot. */
-class Modem
-{
-public:
-    Modem(std::size_t slot, const Sim &sim);
-
-    QString path() const { return m_path; }
-    void attach(Service &service);
-    void detach() { m_service = nullptr; }
-    Properties properties() const;
-    QJsonObject describe() const;
-    void pullSim();
-    void insertSim();
-
-private:
-    QStringList interfaces() const;
-    QStringList features() const;
-    Properties simProperties() const;
-    void offerSim();
-    void setProperty(MethodCall &call);
-    void setPowered(bool powered);
-    void setOnline(bool online);
-    void emitChange(const QString &interface, const QString &name, const Variant &value) const;
-
-    const std::size_t m_slot;
-    const QString m_path;
-    const Sim &m_sim;
-    bool m_powered = true;
-    bool m_online = true;
-    Service *m_service = nullptr;
-};
-
-Modem::Modem(std::size_t slot, const Sim &sim)
-    : m_slot(slot)
-    , m_path(QStringLiteral("/ril_%1").arg(slot))
-    , m_sim(sim)
-{
-}
-
-void Modem::attach(Service &service)
-{
-    m_service = &service;
-    service.addObject(m_path, modemInterface,
-                      {
-                          {QStringLiteral("GetProperties"),
-                           [this](MethodCall &call) {
-                               call.reply(g_variant_new("(@a{sv})", toVariant(properties())));
-                           }},
-                          {QStringLiteral("SetProperty"),
-                           [this](MethodCall &call) {
-                               setProperty(call);
-                           }},
-                      });
-    if (m_powered)
-        offerSim();
-}
-
-void Modem::offerSim()
-{
-    m_service->addObject(m_path, simInterface,
-                         {
-                             {QStringLiteral("GetProperties"),
-                              [this](MethodCall &call) {
-                                  call.reply(g_variant_new("(@a{sv})", toVariant(simProperties())));
-                              }},
-                         });
-}
-
-QStringList Modem::interfaces() const
-{
-    return m_powered ? QStringList{simInterface} : QStringList();
-}
-
-QStringList Modem::features() const
-{
-    return m_powered && m_sim.present ? QStringList{QStringLiteral("sim")} : QStringList();
-}
-
-Properties Modem::properties() const
-{
-    return {
-        {poweredProperty, fromBool(m_powered)},
-        {onlineProperty, fromBool(m_online)},
-        {QStringLiteral("Lockdown"), fromBool(false)},
-        {QStringLiteral("Emergency"), fromBool(false)},
-        {QStringLiteral("Name"), fromText(QStringLiteral("Slot %1").arg(m_slot))},
-        {QStringLiteral("Manufacturer"), fromText(QStringLiteral("Corvane"))},
-        {QStringLiteral("Model"), fromText(QStringLiteral("Simulated modem"))},
-        {QStringLiteral("Revision"), fromText(QStringLiteral("1.0"))},
-        {QStringLiteral("Serial"), fromText(QStringLiteral("35824005111110%1").arg(m_slot))},
-        {QStringLiteral("Type"), fromText(QStringLiteral("hardware"))},
-        {QStringLiteral("Features"), fromList(features())},
-        {QStringLiteral("Interfaces"), fromList(interfaces())},
+    static const QStringList words{
+        QStringLiteral("none"),       QStringLiteral("pin"),           QStringLiteral("phone"),
+        QStringLiteral("firstphone"), QStringLiteral("pin2"),          QStringLiteral("network"),
+        QStringLiteral("netsub"),     QStringLiteral("service"),       QStringLiteral("corp"),
+        QStringLiteral("puk"),        QStringLiteral("firstphonepuk"), QStringLiteral("puk2"),
+        QStringLiteral("networkpuk"), QStringLiteral("netsubpuk"),     QStringLiteral("servicepuk"),
+        QStringLiteral("corppuk"),
     };
+    return words;
 }
 
-Properties Modem::simProperties() const
+const QStringList &registrationStates()
 {
-    Properties properties{{QStringLiteral("Present"), fromBool(m_sim.present)}};
-    if (m_sim.present) {
-        properties.insert(properties.end(),
-                          {
-                              {QStringLiteral("SubscriberIdentity"), fromText(m_sim.imsi)},
-                              {QStringLiteral("CardIdentifier"), fromText(m_sim.iccid)},
-                              {QStringLiteral("ServiceProviderName"), fromText(m_sim.provider)},
-                              {QStringLiteral("SubscriberNumbers"), fromList(m_sim.numbers)},
-                              {QStringLiteral("MobileCountryCode"), fromText(m_sim.imsi.left(3))},
-                              {QStringLiteral("MobileNetworkCode"), fromText(m_sim.imsi.mid(3, 2))},
-                              {QStringLiteral("PinRequired"), fromText(QStringLiteral("none"))},
-                          });
-    }
-    return properties;
+    static const QStringList words{QStringLiteral("unregistered"), QStringLiteral("registered"),
+                                   QStringLiteral("searching"),    QStringLiteral("denied"),
+                                   QStringLiteral("unknown"),      QStringLiteral("roaming")};
+    return words;
 }
 
-void Modem::setProperty(MethodCall &call)
+void checkWord(const QString &word, const QStringList &known)
 {
-    const QString name = call.text(0);
-    if (name != poweredProperty && name != onlineProperty)
-        throw Ofono::invalidArguments(QStringLiteral("There is no property %1 that could be set").arg(name));
-    Variant value(g_variant_get_child_value(call.arguments(), 1));
-    value = Variant(g_variant_get_variant(value.get()));
-    if (!g_variant_is_of_type(value.get(), G_VARIANT_TYPE_BOOLEAN))
-        throw Ofono::invalidArguments(QStringLiteral("%1 is a boolean").arg(name));
-    const bool wanted = g_variant_get_boolean(value.get());
-    if (name == onlineProperty && wanted && !m_powered)
-        throw Ofono::notAvailable(QStringLiteral("The modem is not powered"));
-    call.reply();
-
-    if (name == poweredProperty)
-        setPowered(wanted);
-    else
-        setOnline(wanted);
+    if (!known.contains(word))
+        throw Refusal(QStringLiteral("\"%1\" is none of %2").arg(word, known.join(QStringLiteral(", "))));
 }
 
-void Modem::setPowered(bool powered)
+bool isOn(const QString &word)
 {
-    if (powered == m_powered)
-        return;
-    if (!powered)
-        setOnline(false);
-    m_powered = powered;
-    if (powered)
-        offerSim();
-    else
-        m_service->removeObject(m_path, simInterface);
-    emitChange(modemInterface, poweredProperty, fromBool(powered));
-    emitChange(modemInterface, QStringLiteral("Interfaces"), fromList(interfaces()));
-    emitChange(modemInterface, QStringLiteral("Features"), fromList(features()));
-}
-
-void Modem::setOnline(bool online)
-{
-    if (online == m_online)
-        return;
-    m_online = online;
-    emitChange(modemInterface, onlineProperty, fromBool(online));
-}
-
-void Modem::emitChange(const QString &interface, const QString &name, const Variant &value) const
-{
-    if (m_service) {
-        m_service->emitSignal(m_path, interface, propertyChanged,
-                              g_variant_new("(sv)", name.toUtf8().constData(), value.get()));
-    }
-}
-
-void Modem::pullSim()
-{
-    if (!m_powered)
-        return;
-    emitChange(simInterface, QStringLiteral("Present"), fromBool(false));
-    emitChange(modemInterface, QStringLiteral("Features"), fromList(features()));
-}
-
-void Modem::insertSim()
-{
-    if (!m_powered)
-        return;
-    for (const auto &[name, value] : simProperties())
-        emitChange(simInterface, name, value);
-    emitChange(modemInterface, QStringLiteral("Features"), fromList(features()));
-}
-
-QJsonObject Modem::describe() const
-{
-    return {{QStringLiteral("path"), m_path},
-            {QStringLiteral("powered"), m_powered},
-            {QStringLiteral("online"), m_online}};
+    checkWord(word, {QStringLiteral("on"), QStringLiteral("off")});
+    return word == QLatin1String("on");
 }
 
 class Modems : public Component
 {
 public:
-    explicit Modems(Phone &phone);
+    Modems(const QJsonObject &profile, Phone &phone);
 
     void attach(Service &service) override;
     void detach() override;
@@ -259,45 +69,81 @@ public:
 
 private:
     std::size_t slot(const QString &text) const;
+    void announce();
     QString pullSim(const QString &slotText);
     QString insertSim(const QStringList &arguments);
+    QString lockSim(const QStringList &arguments);
+    QString changeSim(const QString &slotText, const std::function<void(Sim &)> &change);
+    QString chooseSim(const QStringList &arguments);
+    QString setModemThere(const QString &slotText, bool isThere);
+    QString setModemEnabled(const QString &slotText, bool enabled);
+    QString setRegistration(const QStringList &arguments);
 
     Phone &m_phone;
-    std::vector<Modem> m_modems; ///< by slot
+    ModemList m_modems; ///< by slot
+    ModemManager m_manager;
+    Service *m_service = nullptr;
 };
 
-Modems::Modems(Phone &phone)
-    : m_phone(phone)
+ModemList createModems(const QJsonObject &profile, const Phone &phone, const std::function<void()> &changed)
 {
-    m_modems.reserve(phone.sims.size());
-    for (std::size_t slot = 0; slot < phone.sims.size(); ++slot)
-        m_modems.emplace_back(slot, phone.sims[slot]);
+    ModemList modems;
+    const QJsonArray slotProfiles = profile.value(QLatin1String("sims")).toArray();
+    for (std::size_t slot = 0; slot < phone.sims.size(); ++slot) {
+        modems.push_back(
+            std::make_unique<Modem>(slot, phone.sims[slot], slotProfiles.at(int(slot)).toObject(), changed));
+    }
+    return modems;
+}
+
+Modems::Modems(const QJsonObject &profile, Phone &phone)
+    : m_phone(phone)
+    , m_modems(createModems(profile, phone, [this] { announce(); }))
+    , m_manager(m_modems, profile.value(QLatin1String("telephony")).toObject(), [this] { announce(); })
+{
+    for (const std::unique_ptr<Modem> &modem : m_modems)
+        modem->setExtended(m_manager.isOffered());
 }
 
 void Modems::attach(Service &service)
 {
+    m_service = &service;
     service.addObject(managerPath, managerInterface,
                       {
                           {QStringLiteral("GetModems"),
                            [this](MethodCall &call) {
                                GVariantBuilder modems;
                                g_variant_builder_init(&modems, G_VARIANT_TYPE("a(oa{sv})"));
-                               for (const Modem &modem : m_modems) {
-                                   g_variant_builder_add(&modems, "(o@a{sv})",
-                                                         modem.path().toUtf8().constData(),
-                                                         toVariant(modem.properties()));
+                               for (const std::unique_ptr<Modem> &modem : m_modems) {
+                                   if (modem->isThere())
+                                       g_variant_builder_add(&modems, "(o@a{sv})",
+                                                             modem->path().toUtf8().constData(),
+                                                             toVariant(modem->properties()));
                                }
                                call.reply(g_variant_new("(a(oa{sv}))", &modems));
                            }},
                       });
-    for (Modem &modem : m_modems)
-        modem.attach(service);
+    for (const std::unique_ptr<Modem> &modem : m_modems)
+        modem->attach(service);
+    m_manager.attach(service);
 }
 
 void Modems::detach()
 {
-    for (Modem &modem : m_modems)
-        modem.detach();
+    for (const std::unique_ptr<Modem> &modem : m_modems)
+        modem->detach();
+    m_manager.detach();
+    m_service = nullptr;
+}
+
+/** Makes every interface tell what has changed. */
+void Modems::announce()
+{
+    m_manager.announce();
+    for (const std::unique_ptr<Modem> &modem : m_modems)
+        modem->announce();
+    // A default SIM is one whose IMSI has been told.
+    m_manager.announceDefaults();
 }
 
 void Modems::describe(QJsonObject &state) const
@@ -310,14 +156,16 @@ void Modems::describe(QJsonObject &state) const
             {QStringLiteral("provider"), sim.provider},
             {QStringLiteral("numbers"), QJsonArray::fromStringList(sim.numbers)},
             {QStringLiteral("present"), sim.present},
+            {QStringLiteral("pin"), sim.pin},
         };
     }
     state.insert(QStringLiteral("sims"), sims);
 
     QJsonArray modems;
-    for (const Modem &modem : m_modems)
-        modems << modem.describe();
+    for (const std::unique_ptr<Modem> &modem : m_modems)
+        modems << modem->describe();
     state.insert(QStringLiteral("modems"), modems);
+    state.insert(QStringLiteral("telephony"), m_manager.describe());
 }
 
 std::size_t Modems::slot(const QString &text) const
@@ -336,7 +184,7 @@ QString Modems::pullSim(const QString &slotText)
     if (!sim.present)
         throw Refusal(QStringLiteral("There is no SIM in slot %1").arg(index));
     sim.present = false;
-    m_modems[index].pullSim();
+    announce();
     return QStringLiteral("The SIM %1 is out of slot %2").arg(sim.imsi).arg(index);
 }
 
@@ -361,8 +209,89 @@ QString Modems::insertSim(const QStringList &arguments)
     if (imsi != sim.imsi)
         sim = m_phone.cardWithImsi(imsi);
     sim.present = true;
-    m_modems[index].insertSim();
+    announce();
     return QStringLiteral("The SIM %1 is in slot %2").arg(imsi).arg(index);
+}
+
+QString Modems::lockSim(const QStringList &arguments)
+{
+    const std::size_t index = slot(arguments.at(0));
+    const QString pin = arguments.at(1);
+    checkWord(pin, pinStates());
+    Sim &sim = m_phone.sims[index];
+    if (!sim.present)
+        throw Refusal(QStringLiteral("There is no SIM in slot %1; insert one").arg(index));
+    const bool wasUsable = sim.isUsable();
+    sim.pin = pin;
+    if (wasUsable && !sim.isUsable()) {
+        // Nothing locks a card in use; it asks for its PIN when it starts anew.
+        sim.present = false;
+        announce();
+        sim.present = true;
+    }
+    announce();
+    return QStringLiteral("The SIM in slot %1 requires \"%2\"").arg(QString::number(index), pin);
+}
+
+QString Modems::changeSim(const QString &slotText, const std::function<void(Sim &)> &change)
+{
+    change(m_phone.sims[slot(slotText)]);
+    announce();
+    return QString();
+}
+
+QString Modems::chooseSim(const QStringList &arguments)
+{
+    checkWord(arguments.at(0), {QStringLiteral("voice"), QStringLiteral("data")});
+    const std::size_t index = slot(arguments.at(1));
+    const Sim &sim = m_phone.sims[index];
+    if (!sim.isUsable())
+        throw Refusal(QStringLiteral("There is no SIM in slot %1 that could be used").arg(index));
+    if (arguments.at(0) == QLatin1String("voice"))
+        m_manager.chooseVoiceSim(sim.imsi);
+    else
+        m_manager.chooseDataSim(sim.imsi);
+    announce();
+    return QStringLiteral("The SIM %1 is the %2 SIM").arg(sim.imsi, arguments.at(0));
+}
+
+QString Modems::setModemThere(const QString &slotText, bool isThere)
+{
+    const std::size_t index = slot(slotText);
+    Modem &modem = *m_modems[index];
+    if (modem.isThere() == isThere) {
+        throw Refusal(isThere ? QStringLiteral("The modem of slot %1 is there").arg(index)
+                              : QStringLiteral("The modem of slot %1 is away").arg(index));
+    }
+    modem.setThere(isThere);
+    const QString path = modem.path();
+    // Who hears of the modem finds it.
+    modem.announce();
+    if (m_service) {
+        const QString member = isThere ? QStringLiteral("ModemAdded") : QStringLiteral("ModemRemoved");
+        m_service->emitSignal(
+            managerPath, managerInterface, member,
+            isThere ? g_variant_new("(o@a{sv})", path.toUtf8().constData(), toVariant(modem.properties()))
+                    : g_variant_new("(o)", path.toUtf8().constData()));
+    }
+    announce();
+    return QString();
+}
+
+QString Modems::setModemEnabled(const QString &slotText, bool enabled)
+{
+    m_modems[slot(slotText)]->setEnabled(enabled);
+    announce();
+    return QString();
+}
+
+QString Modems::setRegistration(const QStringList &arguments)
+{
+    const std::size_t index = slot(arguments.at(0));
+    checkWord(arguments.at(1), registrationStates());
+    m_modems[index]->setRegistration(arguments.at(1));
+    announce();
+    return QString();
 }
 
 std::vector<Action> Modems::actions()
@@ -377,6 +306,68 @@ std::vector<Action> Modems::actions()
          QStringLiteral("puts the SIM back, or another one in its place"), 1, 2,
          [this](const QStringList &arguments) {
              return insertSim(arguments);
+         }},
+        {QStringLiteral("sim lock"), QStringLiteral("SLOT PIN-STATE"),
+         QStringLiteral("makes the SIM require a PIN (pin), an unblocking key (puk)... or none"), 2, 2,
+         [this](const QStringList &arguments) {
+             return lockSim(arguments);
+         }},
+        {QStringLiteral("sim default"), QStringLiteral("voice|data SLOT"),
+         QStringLiteral("chooses the SIM for calls or for mobile data"), 2, 2,
+         [this](const QStringList &arguments) {
+             return chooseSim(arguments);
+         }},
+        {QStringLiteral("sim provider"), QStringLiteral("SLOT NAME"),
+         QStringLiteral("renames the provider of the SIM"), 2, 2,
+         [this](const QStringList &arguments) {
+             return changeSim(arguments.first(), [&](Sim &sim) { sim.provider = arguments.at(1); });
+         }},
+        {QStringLiteral("sim numbers"), QStringLiteral("SLOT [NUMBER...]"),
+         QStringLiteral("writes the subscriber's own numbers to the SIM"), 1, 20,
+         [this](const QStringList &arguments) {
+             return changeSim(arguments.first(), [&](Sim &sim) { sim.numbers = arguments.mid(1); });
+         }},
+        {QStringLiteral("network"), QStringLiteral("SLOT STATUS"),
+         QStringLiteral("what the network makes of the SIM: ")
+             + registrationStates().join(QStringLiteral(", ")),
+         2, 2,
+         [this](const QStringList &arguments) {
+             return setRegistration(arguments);
+         }},
+        {QStringLiteral("modem remove"), QStringLiteral("SLOT"),
+         QStringLiteral("makes the modem of a slot vanish"), 1, 1,
+         [this](const QStringList &arguments) {
+             return setModemThere(arguments.first(), false);
+         }},
+        {QStringLiteral("modem add"), QStringLiteral("SLOT"), QStringLiteral("brings the modem back"), 1, 1,
+         [this](const QStringList &arguments) {
+             return setModemThere(arguments.first(), true);
+         }},
+        {QStringLiteral("modem disable"), QStringLiteral("SLOT"),
+         QStringLiteral("takes a slot out of use: its modem has no power"), 1, 1,
+         [this](const QStringList &arguments) {
+             return setModemEnabled(arguments.first(), false);
+         }},
+        {QStringLiteral("modem enable"), QStringLiteral("SLOT"), QStringLiteral("takes it into use again"), 1,
+         1,
+         [this](const QStringList &arguments) {
+             return setModemEnabled(arguments.first(), true);
+         }},
+        {QStringLiteral("phone ready"), QStringLiteral("on|off"),
+         QStringLiteral("whether the telephony service has looked into all slots"), 1, 1,
+         [this](const QStringList &arguments) {
+             m_manager.setReady(isOn(arguments.first()));
+             announce();
+             return QString();
+         }},
+        {QStringLiteral("phone extensions"), QStringLiteral("on|off"),
+         QStringLiteral("without them the telephony service is a stock one"), 1, 1,
+         [this](const QStringList &arguments) {
+             m_manager.setOffered(isOn(arguments.first()));
+             for (const std::unique_ptr<Modem> &modem : m_modems)
+                 modem->setExtended(m_manager.isOffered());
+             announce();
+             return QString();
          }},
     };
 }
@@ -399,12 +390,23 @@ QString problemOf(const QJsonObject &profile)
         }
         seen.insert(imsi);
     }
+
+    const QJsonObject telephony = profile.value(QLatin1String("telephony")).toObject();
+    for (const char *choice : {"voiceSim", "dataSim"}) {
+        const QJsonValue slot = telephony.value(QLatin1String(choice));
+        if (slot.isDouble()
+            && sims.at(slot.toInt()).toObject().value(QLatin1String("imsi")).toString().isEmpty()) {
+            return QStringLiteral("/telephony/%1: slot %2 has no card")
+                .arg(QLatin1String(choice))
+                .arg(slot.toInt());
+        }
+    }
     return QString();
 }
 
 const ComponentRegistration registration({
     Ofono::serviceName,
-    [](const QJsonObject &, Phone &phone) { return std::make_unique<Modems>(phone); },
+    [](const QJsonObject &profile, Phone &phone) { return std::make_unique<Modems>(profile, phone); },
     problemOf,
 });
 

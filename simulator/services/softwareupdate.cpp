@@ -1,5 +1,6 @@
 // SPDX-License-Identifier: LGPL-2.1-or-later
 #include "component.h"
+#include "mdmproxy.h"
 #include "refusal.h"
 #include "service.h"
 #include "timer.h"
@@ -20,7 +21,6 @@ namespace Simulator
 namespace
 {
 
-const QLatin1String serviceName("org.corvaneos.mdmproxy");
 const QLatin1String objectPath("/Corvane/Mdm/Proxy/SoftwareUpdate");
 const QLatin1String interfaceName("org.corvaneos.mdmproxy.softwareupdate");
 
@@ -419,7 +419,7 @@ QString problemOf(const QJsonObject &profile)
 }
 
 const ComponentRegistration registration({
-    serviceName,
+    MdmProxy::serviceName,
     [](const QJsonObject &profile, Phone &) {
         return std::make_unique<SoftwareUpdate>(profile.value(QLatin1String("softwareUpdate")).toObject());
     },

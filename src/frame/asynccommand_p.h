@@ -11,11 +11,12 @@ namespace Mdm
 {
 
 /** Hands the answer of @p call to @p slot of @p owner, which must delete the watcher later; dies with @p
- * owner. */
+ * owner, or with @p parent when there is one. */
 template <typename Owner>
-void watchCall(const QDBusPendingCall &call, Owner *owner, void (Owner::*slot)(QDBusPendingCallWatcher *))
+void watchCall(const QDBusPendingCall &call, Owner *owner, void (Owner::*slot)(QDBusPendingCallWatcher *),
+               QObject *parent = nullptr)
 {
-    auto *watcher = new QDBusPendingCallWatcher(call, owner);
+    auto *watcher = new QDBusPendingCallWatcher(call, parent ? parent : owner);
     QObject::connect(watcher, &QDBusPendingCallWatcher::finished, owner, slot);
 }
 

@@ -253,7 +253,8 @@ void MdmctlPolicyTest::wrongPolicyIsRefusedWithThePath_data()
     QTest::newRow("syntax") << QByteArray("{\n\"calls\": ,}") << R"(FILE:2:10: illegal value)";
     QTest::newRow("unknown family")
         << QByteArray(R"({"call": {}})")
-        << R"(FILE: /call: unknown member; must be one of "$schema", "calls", "description", "name", "softwareUpdate")";
+        << R"(FILE: /call: unknown member; must be one of "$schema", "calls", "data", )"
+           R"("description", "name", "sms", "softwareUpdate")";
     QTest::newRow("unknown member")
         << QByteArray(R"({"calls": {"dail": {}}})")
         << R"(FILE: /calls/dail: unknown member; must be one of "dial", "incoming")";
@@ -476,6 +477,8 @@ void MdmctlPolicyTest::exportIsWhatCheckAccepts()
     QCOMPARE(policy,
              json(R"({"calls": {"dial": {"default": "allow", "rules": [{"imsi": "1", "action": "block"}]},
                                         "incoming": {"default": "hangup", "rules": []}},
+                              "sms": {"default": "allow", "rules": []},
+                              "data": {"default": "allow", "rules": []},
                               "softwareUpdate": {"install": "latest"}})"));
     QCOMPARE(run(QStringLiteral("check"), exported.output.toUtf8()).status, 0);
     call(Dial, QStringLiteral("ClearRules"));
@@ -495,9 +498,14 @@ void MdmctlPolicyTest::exportWithoutAService()
 {
     m_phone.stopService(Ofono);
     const Mdmctl::Result exported = Mdmctl::run({QStringLiteral("policy"), QStringLiteral("export")});
-    QCOMPARE(exported.errors,
-             QStringLiteral("mdmctl: \"calls\" is left out: the telephony service (org.ofono) is "
-                            "not running\n"));
+    QCOMPARE(exported.errors, [] {
+        QString errors;
+        for (const char *section : {"calls", "sms", "data"})
+            errors += QStringLiteral(
+                          "mdmctl: \"%1\" is left out: the telephony service (org.ofono) is not running\n")
+                          .arg(QLatin1String(section));
+        return errors;
+    }());
     QVERIFY(exported.json().contains(QStringLiteral("softwareUpdate")));
     QCOMPARE(exported.status, 3);
 }

@@ -63,6 +63,12 @@ void MdmctlUsageTest::helpTeachesAtEachLevel_data()
                                             QStringLiteral("--timeout SECONDS"), QStringLiteral("Examples:"),
                                             QStringLiteral("JSON"), QStringLiteral("Exit status: 0 done")};
     QTest::newRow("optional") << "update download" << QStringList{QStringLiteral("[OPTIONS] [VERSION]")};
+    QTest::newRow("family without directions")
+        << "data set"
+        << QStringList{QStringLiteral("mdmctl data set [OPTIONS] IMSI=ACTION..."),
+                       QStringLiteral("mdmctl data set 244")};
+    QTest::newRow("search") << "call-statistics search"
+                            << QStringList{QStringLiteral("--from TIME"), QStringLiteral("\"results\"")};
     QTest::newRow("several") << "calls set" << QStringList{QStringLiteral("DIR IMSI=ACTION...")};
 }
 
@@ -97,7 +103,9 @@ void MdmctlUsageTest::mistakesAreToldInOneLine_data()
     const auto row = [](const char *arguments, const char *message) {
         QTest::newRow(arguments) << QString::fromUtf8(message);
     };
-    row("", R"("mdmctl" needs a command: must be one of "update", "calls", "policy", "completion")");
+    row("",
+        R"("mdmctl" needs a command: must be one of "update", "calls", "sms", "data", )"
+        R"("call-statistics", "policy", "completion")");
     row("calls --json",
         R"("mdmctl calls" needs a command: must be one of "show", "add", "remove", "set", "clear", )"
         R"("default", "watch")");
@@ -158,7 +166,7 @@ void MdmctlUsageTest::bashCompletes_data()
         QTest::newRow(line) << QString::fromUtf8(expected);
     };
     // A line that ends with a space has an empty word at the cursor.
-    row("mdmctl ", "update calls policy completion");
+    row("mdmctl ", "update calls sms data call-statistics policy completion");
     row("mdmctl p", "policy");
     row("mdmctl calls ", "show add remove set clear default watch");
     row("mdmctl calls add ", "dial incoming");
@@ -166,6 +174,8 @@ void MdmctlUsageTest::bashCompletes_data()
     row("mdmctl calls add --timeout 3 in", "incoming");
     row("mdmctl calls add --timeout ", "");
     row("mdmctl calls add dial --", "--json --timeout --help");
+    row("mdmctl sms add 24405 ", "block allow");
+    row("mdmctl call-statistics search --", "--first --second --from --to --json --timeout --help");
     row("mdmctl update install --w", "--wait");
     row("mdmctl policy check /etc/host", "/etc/host.conf /etc/hostname /etc/hosts");
     row("mdmctl completion ", "bash");

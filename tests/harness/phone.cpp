@@ -119,13 +119,26 @@ void Phone::settle(const QString &service)
 
 QStringList Phone::takeJournal(const QString &service)
 {
+    return takeJournal(service, false);
+}
+
+QStringList Phone::takeJournalWithInterfaces(const QString &service)
+{
+    return takeJournal(service, true);
+}
+
+QStringList Phone::takeJournal(const QString &service, bool withInterfaces)
+{
     QList<JournalEntry> journal;
     qvariant_cast<QDBusArgument>(control(QStringLiteral("Journal"), {m_journalPosition}).first()) >> journal;
     QStringList calls;
     for (const JournalEntry &entry : qAsConst(journal)) {
         m_journalPosition = entry.number;
-        if (entry.service == service && !entry.interface.startsWith(QLatin1String("org.freedesktop.DBus")))
-            calls.append(entry.path + QLatin1Char(' ') + entry.member + QLatin1Char(' ') + entry.arguments);
+        if (entry.service != service || entry.interface.startsWith(QLatin1String("org.freedesktop.DBus")))
+            continue;
+        const QString member
+            = withInterfaces ? entry.interface + QLatin1Char('.') + entry.member : entry.member;
+        calls.append(entry.path + QLatin1Char(' ') + member + QLatin1Char(' ') + entry.arguments);
     }
     return calls;
 }

@@ -48,12 +48,15 @@ public:
     /** Calls received since construction or the last call, as "path member arguments"; without introspection.
      */
     QStringList takeJournal(const QString &service);
+    /** The same as "path interface.member arguments". */
+    QStringList takeJournalWithInterfaces(const QString &service);
 
     void act(const QString &action, const QStringList &arguments);
     /** The phone's own view of its state. */
     QJsonObject state() const;
 
 private:
+    QStringList takeJournal(const QString &service, bool withInterfaces);
     void ping(const QString &service) const;
     QVariantList control(const QString &method, const QVariantList &arguments = QVariantList()) const;
     void setFault(const QString &service, const QString &path, const QString &member, const QString &kind,

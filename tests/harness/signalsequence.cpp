@@ -3,9 +3,13 @@
 
 #include "waiting.h"
 
+#include <corvanemdm/callstatistics.h>
 #include <corvanemdm/simfilter.h>
+#include <corvanemdm/siminfo.h>
 
+using Corvane::Mdm::CallStatistics;
 using Corvane::Mdm::SimFilter;
+using Corvane::Mdm::SimInfo;
 
 namespace
 {
@@ -16,22 +20,51 @@ QString text(const SimFilter::Rule &rule)
     return rule.imsi + QLatin1Char(':') + QLatin1String(actions[rule.action]);
 }
 
+QString text(const CallStatistics::Result &result)
+{
+    return result.time.toString(Qt::ISODate) + QLatin1Char('=') + QString::number(result.value);
+}
+
+template <typename T> QString text(const QList<T> &list)
+{
+    QStringList texts;
+    for (const T &item : list)
+        texts.append(text(item));
+    return QLatin1Char('[') + texts.join(QLatin1Char(' ')) + QLatin1Char(']');
+}
+
 QString text(int type, const void *value)
 {
     if (type == qMetaTypeId<SimFilter::Rule>())
         return text(*static_cast<const SimFilter::Rule *>(value));
-    if (type == qMetaTypeId<SimFilter::RuleList>()) {
-        QStringList rules;
-        for (const SimFilter::Rule &rule : *static_cast<const SimFilter::RuleList *>(value))
-            rules.append(text(rule));
-        return QLatin1Char('[') + rules.join(QLatin1Char(' ')) + QLatin1Char(']');
-    }
+    if (type == qMetaTypeId<SimFilter::RuleList>())
+        return text(*static_cast<const SimFilter::RuleList *>(value));
+    if (type == qMetaTypeId<QList<CallStatistics::Result>>())
+        return text(*static_cast<const QList<CallStatistics::Result> *>(value));
+    if (type == qMetaTypeId<SimInfo::SimState>())
+        return simStateText(*static_cast<const SimInfo::SimState *>(value));
     if (type == QMetaType::UnknownType)
         return QStringLiteral("<type unknown to the meta-object system>");
     return QVariant(type, value).toString();
 }
 
 } // namespace
+
+QString simStateText(const SimInfo::SimState &state)
+{
+    QStringList words{state.modemPath};
+    if (state.present)
+        words << QStringLiteral("present");
+    if (state.voiceSim)
+        words << QStringLiteral("voice");
+    if (state.dataSim)
+        words << QStringLiteral("data");
+    if (state.enabled)
+        words << QStringLiteral("enabled");
+    words << QStringLiteral("pin:%1").arg(state.pinRequired)
+          << QStringLiteral("net:%1").arg(state.networkRegistration) << state.imsi;
+    return words.join(QLatin1Char(' ')).trimmed();
+}
 
 SignalSequence::SignalSequence(QObject *object)
 {

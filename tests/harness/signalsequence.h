@@ -2,14 +2,20 @@
 #ifndef CORVANE_TEST_SIGNALSEQUENCE_H
 #define CORVANE_TEST_SIGNALSEQUENCE_H
 
+#include <corvanemdm/siminfo.h>
+
 #include <QtCore/QMetaMethod>
 #include <QtCore/QObject>
 #include <QtCore/QStringList>
 #include <QtCore/QVector>
 
+/** What comparisons look at, such as "/ril_0 present voice data enabled pin:0 net:1 244051234567890". */
+QString simStateText(const Corvane::Mdm::SimInfo::SimState &state);
+
 /**
  * Records every signal that the class of an object declares, in the order of emission and with its arguments,
- * as "name(argument, argument)". Rules read "244:block", lists of rules "[244:block 262:allow]".
+ * as "name(argument, argument)". Rules read "244:block", lists of rules "[244:block 262:allow]",
+ * results of call statistics "2026-03-01T00:00:00Z=3", SIM states as simStateText() writes them.
  *
  * Connects through the meta-object alone, as a binding to another language would.
  */

@@ -471,9 +471,11 @@ void ControlTest::listsAndRefusesActions()
 {
     const QString act = QStringLiteral("Act");
     const QString actions = control(QStringLiteral("Actions"));
-    for (const char *usage : {"(sim pull, SLOT, ", "(sim insert, SLOT [IMSI], ",
-                              "(call dial, IMSI|SLOT [NUMBER], ", "(call incoming, IMSI|SLOT [NUMBER], ",
-                              "(update publish, VERSION [MIB], ", "(update withdraw, VERSION, "})
+    for (const char *usage :
+         {"(sim pull, SLOT, ", "(sim insert, SLOT [IMSI], ", "(call dial, IMSI|SLOT [NUMBER], ",
+          "(call incoming, IMSI|SLOT [NUMBER], ", "(text, IMSI|SLOT [NUMBER], ", "(data, IMSI|SLOT, ",
+          "(call log, outgoing|incoming|missed [SECONDS [TIME]], ", "(update publish, VERSION [MIB], ",
+          "(update withdraw, VERSION, "})
         QVERIFY2(actions.contains(QLatin1String(usage)), qPrintable(actions));
     const QString unknown = control(act, {QStringLiteral("sim push"), QStringList()});
     QVERIFY2(unknown.startsWith(refused + QStringLiteral("There is no action \"sim push\"; there are ")),
@@ -487,9 +489,11 @@ void ControlTest::tellsTheState()
     const QByteArray json
         = m_client->control(QStringLiteral("State")).arguments().first().toString().toUtf8();
     const QJsonObject state = QJsonDocument::fromJson(json).object();
-    QCOMPARE(state.keys(),
-             (QStringList{QStringLiteral("callFilters"), QStringLiteral("modems"), QStringLiteral("name"),
-                          QStringLiteral("sims"), QStringLiteral("softwareUpdate")}));
+    QCOMPARE(
+        state.keys(),
+        (QStringList{QStringLiteral("callFilters"), QStringLiteral("callLog"), QStringLiteral("dataFilter"),
+                     QStringLiteral("modems"), QStringLiteral("name"), QStringLiteral("sims"),
+                     QStringLiteral("smsFilter"), QStringLiteral("softwareUpdate")}));
     QCOMPARE(state.value(QLatin1String("name")).toString(), QStringLiteral("dual-sim"));
 }
 

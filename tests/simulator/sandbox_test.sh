@@ -315,6 +315,14 @@ refusals_help() {
     refusal 2 'wrong.json: /callFilters/dial/rules/0/action: .*"block"' --device wrong.json true
     profile '{"callFilters": {"incoming": {"rules": [{"imsi": "1", "action": "block"}, {"imsi": "1", "action": "allow"}]}}}'
     refusal 2 'wrong.json: /callFilters/incoming/rules/1/imsi: ' --device wrong.json true
+    profile '{"smsFilter": {"default": "hangup"}}'
+    refusal 2 'wrong.json: /smsFilter/default: .*"block"' --device wrong.json true
+    profile '{"dataFilter": {"rules": [{"imsi": "1", "action": "block"}, {"imsi": "1", "action": "allow"}]}}'
+    refusal 2 'wrong.json: /dataFilter/rules/1/imsi: ' --device wrong.json true
+    profile '{"callLog": [{"time": "2026-02-30T00:00:00Z", "direction": "missed"}]}'
+    refusal 2 'wrong.json: /callLog/0/time: ' --device wrong.json true
+    profile '{"callLog": [{"time": "2026-02-03T00:00:00Z", "direction": "missed", "seconds": 1}]}'
+    refusal 2 'wrong.json: /callLog/0/seconds: ' --device wrong.json true
     profile '{"sims": [{"imsi": "244051"}, {"imsi": "244051"}]}'
     refusal 2 'wrong.json: /sims/1/imsi: ' --device wrong.json true
     profile '{"sims": [{"provider": "None"}]}'

@@ -51,6 +51,7 @@ void PolicySectionsTest::settingsComeFromThePolicyAlone()
 {
     const PolicySections sections = makePolicySections({});
     const Policy policy = read(R"({"calls": {"dial": {"rules": []}, "incoming": {"default": "hangup"}},
+                                   "sms": {"default": "block"}, "data": {"rules": [{"imsi": "*", "action": "block"}]},
                                    "softwareUpdate": {"install": "5.1"}})",
                                sections);
     QCOMPARE(policy.error, QString());
@@ -59,10 +60,11 @@ void PolicySectionsTest::settingsComeFromThePolicyAlone()
         for (const Setting &setting : section->settings(policy.settingsOf(*section)))
             settings.append(setting.path + QLatin1Char('=') + setting.wanted.text);
     }
-    QCOMPARE(settings,
-             QStringList({QStringLiteral("calls.dial.rules=no rules"),
-                          QStringLiteral("calls.incoming.default=hangup"),
-                          QStringLiteral("softwareUpdate.install=5.1")}));
+    QCOMPARE(
+        settings,
+        QStringList({QStringLiteral("calls.dial.rules=no rules"),
+                     QStringLiteral("calls.incoming.default=hangup"), QStringLiteral("sms.default=block"),
+                     QStringLiteral("data.rules=*=block"), QStringLiteral("softwareUpdate.install=5.1")}));
 }
 
 void PolicySectionsTest::repeatedRuleIsAFault()

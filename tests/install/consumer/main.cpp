@@ -1,7 +1,11 @@
 // SPDX-License-Identifier: LGPL-2.1-or-later
 // Uses every public class from outside of the project. Where no service answers, it must work as well.
+#include <corvanemdm/callstatistics.h>
 #include <corvanemdm/corvanemdm_global.h>
 #include <corvanemdm/simfilter.h>
+#include <corvanemdm/siminfo.h>
+#include <corvanemdm/simmobiledatafilter.h>
+#include <corvanemdm/simsmsfilter.h>
 #include <corvanemdm/simvoicecallfilter.h>
 #include <corvanemdm/softwareupdate.h>
 
@@ -24,12 +28,43 @@ bool simFilterWorks()
         && text.contains(QLatin1String("allow"));
 }
 
+bool simInfoWorks()
+{
+    const SimInfo info;
+    QObject::connect(&info, &SimInfo::simStateChanged, &info, [](const SimInfo::SimState &) {});
+    const SimInfo::SlotInfo slot(1, QStringLiteral("x"));
+    QString text;
+    QDebug(&text) << SimInfo::UnknownPinState << SimInfo::Roaming << &slot;
+    // Nothing is known before the event loop has run.
+    return !info.available() && info.simSlotStates().isEmpty() && text.contains(QLatin1String("roaming"))
+        && QString(slot) == QLatin1String("Slot(1) = (x)");
+}
+
 bool simVoiceCallFilterWorks()
 {
     SimVoiceCallFilter filter;
     QObject::connect(&filter, &SimVoiceCallFilter::readyChanged, &filter, [] {});
     // Not ready before the event loop has run, so that no request is a change.
     return !filter.ready() && filter.dialRules().isEmpty() && !filter.clearIncomingRules();
+}
+
+bool otherFiltersWork()
+{
+    SimSmsFilter texts;
+    QObject::connect(&texts, &SimSmsFilter::readyChanged, &texts, [] {});
+    SimMobileDataFilter data;
+    QObject::connect(&data, &SimMobileDataFilter::readyChanged, &data, [] {});
+    return !texts.ready() && !texts.clearTextRules() && !data.ready() && !data.clearRules();
+}
+
+bool callStatisticsWork()
+{
+    CallStatistics statistics;
+    int answers = 0;
+    QObject::connect(&statistics, &CallStatistics::searchFinished, &statistics,
+                     [&answers](bool, const QList<CallStatistics::Result> &) { ++answers; });
+    statistics.search(CallStatistics::Filter());
+    return answers == 0;
 }
 
 QString latestVersion()
@@ -45,7 +80,8 @@ QString latestVersion()
 int main(int argc, char **argv)
 {
     QCoreApplication application(argc, argv);
-    const bool works = simFilterWorks() && simVoiceCallFilterWorks();
+    const bool works = simFilterWorks() && simVoiceCallFilterWorks() && otherFiltersWork() && simInfoWorks()
+        && callStatisticsWork();
     QTextStream(stdout) << (works ? "consumer works" : "consumer fails") << ", update: " << latestVersion()
                         << '\n';
     return works ? 0 : 1;

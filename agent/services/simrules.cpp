@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: LGPL-2.1-or-later
-#include "callrules.h"
+#include "simrules.h"
 
 #include <QtCore/QJsonObject>
 #include <QtCore/QMap>
@@ -18,7 +18,7 @@ namespace
 struct NamedAction {
     SimFilter::Action action;
     QLatin1String name;
-    bool incomingOnly;
+    bool incomingCallsOnly;
 };
 
 const NamedAction actions[] = {
@@ -30,9 +30,9 @@ const NamedAction actions[] = {
 const QLatin1String imsiMember("imsi");
 const QLatin1String actionMember("action");
 
-bool fits(const NamedAction &named, CallDirection direction)
+bool fits(const NamedAction &named, Traffic traffic)
 {
-    return direction == CallDirection::Incoming || !named.incomingOnly;
+    return traffic == Traffic::IncomingCalls || !named.incomingCallsOnly;
 }
 
 QMap<QString, SimFilter::Action> byImsi(const SimFilter::RuleList &rules)
@@ -45,22 +45,57 @@ QMap<QString, SimFilter::Action> byImsi(const SimFilter::RuleList &rules)
 
 } // namespace
 
-QString directionName(CallDirection direction)
+RuleFamily RuleFamily::calls()
 {
-    return direction == CallDirection::Dial ? QStringLiteral("dial") : QStringLiteral("incoming");
+    return {
+        QStringLiteral("calls"), QStringLiteral("calls"), {Traffic::DialledCalls, Traffic::IncomingCalls}};
 }
 
-QStringList directionNames()
+RuleFamily RuleFamily::sms()
+{
+    return {QStringLiteral("sms"), QStringLiteral("text messages"), {Traffic::Texts}};
+}
+
+RuleFamily RuleFamily::data()
+{
+    return {QStringLiteral("data"), QStringLiteral("mobile data"), {Traffic::Data}};
+}
+
+QStringList RuleFamily::directionNames() const
 {
     QStringList names;
-    for (const CallDirection direction : allCallDirections)
-        names.append(directionName(direction));
+    for (const Traffic each : traffic)
+        names.append(directionName(each));
     return names;
 }
 
-CallDirection directionNamed(const QString &name)
+Traffic RuleFamily::trafficNamed(const QString &direction) const
 {
-    return name == directionName(CallDirection::Dial) ? CallDirection::Dial : CallDirection::Incoming;
+    const int index = directionNames().indexOf(direction);
+    return traffic.at(index < 0 ? 0 : index);
+}
+
+QStringList RuleFamily::actionNames() const
+{
+    QStringList names;
+    for (const Traffic each : traffic)
+        names += Agent::actionNames(each);
+    names.removeDuplicates();
+    return names;
+}
+
+QString directionName(Traffic traffic)
+{
+    switch (traffic) {
+    case Traffic::DialledCalls:
+        return QStringLiteral("dial");
+    case Traffic::IncomingCalls:
+        return QStringLiteral("incoming");
+    case Traffic::Texts:
+    case Traffic::Data:
+        break;
+    }
+    return QString();
 }
 
 QString actionName(SimFilter::Action action)
@@ -72,23 +107,29 @@ QString actionName(SimFilter::Action action)
     return QString::number(action);
 }
 
-QStringList actionNames(CallDirection direction)
+QStringList actionNames(Traffic traffic)
 {
     QStringList names;
     for (const NamedAction &named : actions) {
-        if (fits(named, direction))
+        if (fits(named, traffic))
             names.append(named.name);
     }
     return names;
 }
 
-std::optional<SimFilter::Action> actionNamed(CallDirection direction, const QString &name)
+std::optional<SimFilter::Action> actionNamed(Traffic traffic, const QString &name)
 {
     for (const NamedAction &named : actions) {
-        if (named.name == name && fits(named, direction))
+        if (named.name == name && fits(named, traffic))
             return named.action;
     }
     return std::nullopt;
+}
+
+std::optional<SimFilter::Action> actionNamed(const QString &name)
+{
+    // No action exists for other traffic alone.
+    return actionNamed(Traffic::IncomingCalls, name);
 }
 
 QJsonArray rulesToJson(const SimFilter::RuleList &rules)
@@ -104,8 +145,7 @@ SimFilter::RuleList rulesFromJson(const QJsonArray &rules)
     SimFilter::RuleList list;
     for (const QJsonValue &element : rules) {
         const QString action = element[actionMember].toString();
-        list.append({element[imsiMember].toString(),
-                     actionNamed(CallDirection::Incoming, action).value_or(SimFilter::Block)});
+        list.append({element[imsiMember].toString(), actionNamed(action).value_or(SimFilter::Block)});
     }
     return list;
 }

@@ -1,12 +1,13 @@
 // SPDX-License-Identifier: LGPL-2.1-or-later
-#ifndef CORVANE_CALLRULES_H
-#define CORVANE_CALLRULES_H
+#ifndef CORVANE_SIMRULES_H
+#define CORVANE_SIMRULES_H
 
 #include <corvanemdm/simfilter.h>
 
 #include <QtCore/QJsonArray>
 #include <QtCore/QString>
 #include <QtCore/QStringList>
+#include <QtCore/QVector>
 
 #include <optional>
 
@@ -15,21 +16,37 @@ namespace Corvane
 namespace Agent
 {
 
-/** A direction of calls that has rules of its own. */
-enum class CallDirection { Dial, Incoming };
+/** A kind of traffic that has rules of its own. */
+enum class Traffic { DialledCalls, IncomingCalls, Texts, Data };
 
-constexpr CallDirection allCallDirections[] = {CallDirection::Dial, CallDirection::Incoming};
+/** A feature family of rules: what has one command, one section of policies and one class of the library. */
+struct RuleFamily {
+    QString name; ///< of the command and of the section
+    QString subject; ///< for people: "rules for ..."
+    QVector<Traffic> traffic;
 
-/** "dial", "incoming" */
-QString directionName(CallDirection direction);
-QStringList directionNames();
-CallDirection directionNamed(const QString &name);
+    static RuleFamily calls();
+    static RuleFamily sms();
+    static RuleFamily data();
+
+    /** Whether its traffic has to be told apart. */
+    bool hasDirections() const { return traffic.size() > 1; }
+    QStringList directionNames() const;
+    Traffic trafficNamed(const QString &direction) const;
+    /** The actions that exist for any of its traffic. */
+    QStringList actionNames() const;
+};
+
+/** "dial", "incoming"; empty for traffic that is the only one of its family. */
+QString directionName(Traffic traffic);
 
 /** "block", "allow", "hangup" */
 QString actionName(Mdm::SimFilter::Action action);
-/** The actions that exist for calls in @p direction. */
-QStringList actionNames(CallDirection direction);
-std::optional<Mdm::SimFilter::Action> actionNamed(CallDirection direction, const QString &name);
+/** The actions that exist for @p traffic. */
+QStringList actionNames(Traffic traffic);
+std::optional<Mdm::SimFilter::Action> actionNamed(Traffic traffic, const QString &name);
+/** The same for any traffic. */
+std::optional<Mdm::SimFilter::Action> actionNamed(const QString &name);
 
 /** Stands for every SIM of the phone. */
 const QLatin1String AnySim("*");
@@ -65,4 +82,4 @@ struct RuleDifference {
 } // namespace Agent
 } // namespace Corvane
 
-#endif // CORVANE_CALLRULES_H
+#endif // CORVANE_SIMRULES_H

@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: LGPL-2.1-or-later
-#include <callrules.h>
+#include <simrules.h>
 
 #include <QtCore/QJsonObject>
 #include <QtTest/QtTest>
@@ -7,12 +7,13 @@
 using namespace Corvane::Agent;
 using Corvane::Mdm::SimFilter;
 
-class CallRulesTest : public QObject
+class SimRulesTest : public QObject
 {
     Q_OBJECT
 
 private Q_SLOTS:
-    void actionsByDirection();
+    void actionsByTraffic();
+    void families();
     void rulesAsJson();
     void rulesAsText();
     void findsTheRepeatedRule();
@@ -33,20 +34,34 @@ const SimFilter::Rule blockEvery(QStringLiteral("*"), SimFilter::Block);
 
 } // namespace
 
-void CallRulesTest::actionsByDirection()
+void SimRulesTest::actionsByTraffic()
 {
-    QCOMPARE(actionNames(CallDirection::Dial),
+    QCOMPARE(actionNames(Traffic::DialledCalls),
              QStringList({QStringLiteral("block"), QStringLiteral("allow")}));
-    QCOMPARE(actionNames(CallDirection::Incoming),
+    QCOMPARE(actionNames(Traffic::IncomingCalls),
              QStringList({QStringLiteral("block"), QStringLiteral("allow"), QStringLiteral("hangup")}));
-    QVERIFY(!actionNamed(CallDirection::Dial, QStringLiteral("hangup")));
-    QVERIFY(actionNamed(CallDirection::Incoming, QStringLiteral("hangup")) == SimFilter::Hangup);
-    QVERIFY(!actionNamed(CallDirection::Incoming, QStringLiteral("ignore")));
-    for (const CallDirection direction : allCallDirections)
-        QVERIFY(directionNamed(directionName(direction)) == direction);
+    QVERIFY(!actionNamed(Traffic::DialledCalls, QStringLiteral("hangup")));
+    QVERIFY(actionNamed(Traffic::IncomingCalls, QStringLiteral("hangup")) == SimFilter::Hangup);
+    QVERIFY(!actionNamed(Traffic::IncomingCalls, QStringLiteral("ignore")));
+    for (const Traffic traffic : {Traffic::Texts, Traffic::Data})
+        QCOMPARE(actionNames(traffic), actionNames(Traffic::DialledCalls));
 }
 
-void CallRulesTest::rulesAsJson()
+void SimRulesTest::families()
+{
+    const RuleFamily calls = RuleFamily::calls();
+    QVERIFY(calls.hasDirections());
+    QCOMPARE(calls.directionNames(), QStringList({QStringLiteral("dial"), QStringLiteral("incoming")}));
+    QCOMPARE(calls.actionNames(), actionNames(Traffic::IncomingCalls));
+    for (const RuleFamily &family : {calls, RuleFamily::sms(), RuleFamily::data()}) {
+        for (const Traffic traffic : family.traffic)
+            QVERIFY(family.trafficNamed(directionName(traffic)) == traffic);
+    }
+    QVERIFY(!RuleFamily::sms().hasDirections());
+    QCOMPARE(RuleFamily::data().actionNames(), actionNames(Traffic::Data));
+}
+
+void SimRulesTest::rulesAsJson()
 {
     const SimFilter::RuleList rules{block1, {QStringLiteral("2"), SimFilter::Hangup}};
     const QJsonArray json = rulesToJson(rules);
@@ -56,13 +71,13 @@ void CallRulesTest::rulesAsJson()
     QCOMPARE(rulesFromJson(json), rules);
 }
 
-void CallRulesTest::rulesAsText()
+void SimRulesTest::rulesAsText()
 {
     QCOMPARE(rulesText({}), QStringLiteral("no rules"));
     QCOMPARE(rulesText({block1, allow3}), QStringLiteral("1=block\n3=allow"));
 }
 
-void CallRulesTest::findsTheRepeatedRule()
+void SimRulesTest::findsTheRepeatedRule()
 {
     QCOMPARE(repeatedRule({}), -1);
     QCOMPARE(repeatedRule({block1, block2}), -1);
@@ -70,7 +85,7 @@ void CallRulesTest::findsTheRepeatedRule()
     QCOMPARE(repeatedRule({blockEvery, block1, blockEvery}), 2);
 }
 
-void CallRulesTest::everySimIsEachSimWithoutARule()
+void SimRulesTest::everySimIsEachSimWithoutARule()
 {
     const QStringList sims{QStringLiteral("1"), QStringLiteral("2")};
     QCOMPARE(expandedRules({blockEvery}, sims), SimFilter::RuleList({block1, block2}));
@@ -79,20 +94,20 @@ void CallRulesTest::everySimIsEachSimWithoutARule()
              SimFilter::RuleList({allow1, block2, allow3}));
 }
 
-void CallRulesTest::everySimWithoutSims()
+void SimRulesTest::everySimWithoutSims()
 {
     QCOMPARE(expandedRules({blockEvery, allow3}, {}), SimFilter::RuleList({allow3}));
     QCOMPARE(expandedRules({}, {QStringLiteral("1")}), SimFilter::RuleList());
 }
 
-void CallRulesTest::differenceIgnoresTheOrder()
+void SimRulesTest::differenceIgnoresTheOrder()
 {
     QVERIFY(RuleDifference({block1, block2}, {block2, block1}).isEmpty());
     QVERIFY(RuleDifference({}, {}).isEmpty());
     QCOMPARE(RuleDifference({block1}, {block1}).toString(), QString());
 }
 
-void CallRulesTest::differenceNamesEachStep()
+void SimRulesTest::differenceNamesEachStep()
 {
     const RuleDifference difference({block1, block2}, {allow3, allow1});
     QCOMPARE(difference.added, SimFilter::RuleList({allow3}));
@@ -102,5 +117,5 @@ void CallRulesTest::differenceNamesEachStep()
     QCOMPARE(difference.toString(), QStringLiteral("add 3=allow; change to 1=allow; remove 2"));
 }
 
-QTEST_APPLESS_MAIN(CallRulesTest)
-#include "callrules_test.moc"
+QTEST_APPLESS_MAIN(SimRulesTest)
+#include "simrules_test.moc"

@@ -18,7 +18,6 @@ namespace Simulator
 namespace
 {
 
-const QLatin1String interfaceName("org.corvaneos.ofono.mdm.VoiceCallFilter");
 constexpr guint32 contractVersion = 1;
 constexpr int longestImsi = 15;
 
@@ -64,17 +63,53 @@ GVariant *toVariant(const std::vector<Rule> &rules)
     return g_variant_builder_end(&list);
 }
 
-/** The calls of one direction: an object of its own. */
+/** How one kind of traffic is called, on the wire, in profiles and by those who act on the phone. */
+struct FilterNames {
+    QString path;
+    QString interface;
+    QString word; ///< in the members of the interface, as in "Add@Rule"
+    guint32 highestVerdict;
+    QString group; ///< the profile's member
+    QString member; ///< of the group; empty: the group is this filter's alone
+    QString action;
+    QString actionUsage;
+    QString traffic; ///< completes "what happens to"
+};
+
+const std::array<FilterNames, 4> allFilters{{
+    {QStringLiteral("/mdm/voicecallfilter/dial"), QStringLiteral("org.corvaneos.ofono.mdm.VoiceCallFilter"),
+     QString(), Allow, QStringLiteral("callFilters"), QStringLiteral("dial"), QStringLiteral("call dial"),
+     QStringLiteral("IMSI|SLOT [NUMBER]"), QStringLiteral("such a call over that SIM")},
+    {QStringLiteral("/mdm/voicecallfilter/incoming"),
+     QStringLiteral("org.corvaneos.ofono.mdm.VoiceCallFilter"), QString(), HangUp,
+     QStringLiteral("callFilters"), QStringLiteral("incoming"), QStringLiteral("call incoming"),
+     QStringLiteral("IMSI|SLOT [NUMBER]"), QStringLiteral("such a call over that SIM")},
+    {QStringLiteral("/mdm/smsfilter/textin"), QStringLiteral("org.corvaneos.ofono.mdm.SmsFilter"),
+     QStringLiteral("Text"), Allow, QStringLiteral("smsFilter"), QString(), QStringLiteral("text"),
+     QStringLiteral("IMSI|SLOT [NUMBER]"), QStringLiteral("a text message to that SIM")},
+    {QStringLiteral("/mdm/gprsfilter"), QStringLiteral("org.corvaneos.ofono.mdm.GprsFilter"), QString(),
+     Allow, QStringLiteral("dataFilter"), QString(), QStringLiteral("data"), QStringLiteral("IMSI|SLOT"),
+     QStringLiteral("mobile data over that SIM")},
+}};
+
+/** What @p object, a profile or a state of the phone, has about a filter. */
+QJsonObject partOf(const QJsonObject &object, const FilterNames &names)
+{
+    const QJsonObject group = object.value(names.group).toObject();
+    return names.member.isEmpty() ? group : group.value(names.member).toObject();
+}
+
+/** The rules and the default action for one kind of traffic: an object of its own. */
 class Filter
 {
 public:
-    Filter(const QString &direction, guint32 highestVerdict, const QJsonObject &profile);
+    Filter(const FilterNames &names, const QJsonObject &profile);
 
-    QString direction() const { return m_direction; }
+    const FilterNames &names() const { return m_names; }
     void attach(Service &service);
     void detach() { m_service = nullptr; }
-    QJsonObject describe() const;
-    /** What happens to a call over the SIM with @p imsi, and why. */
+    void describe(QJsonObject &state) const;
+    /** What happens to the traffic of the SIM with @p imsi, and why. */
     QString judge(const QString &imsi) const;
 
 private:
@@ -83,9 +118,11 @@ private:
     void checkVerdict(guint32 verdict) const;
     void checkRule(const Rule &rule) const;
     Rules::iterator find(const QString &imsi);
-    void emitSignal(const QString &member, GVariant *arguments) const;
+    /** @p pattern is the member with "@" where the interface has its word. */
+    QString memberName(const char *pattern) const;
+    void emitSignal(const char *pattern, GVariant *arguments) const;
     void emitRules() const;
-    void emitRule(const QString &member, Rules::const_iterator rule) const;
+    void emitRule(const char *pattern, Rules::const_iterator rule) const;
 
     void addRule(MethodCall &call);
     void removeRule(MethodCall &call);
@@ -93,18 +130,14 @@ private:
     void clearRules(MethodCall &call);
     void setDefault(MethodCall &call);
 
-    const QString m_direction;
-    const QString m_path;
-    const guint32 m_highestVerdict;
+    const FilterNames &m_names;
     guint32 m_default;
     Rules m_rules;
     Service *m_service = nullptr;
 };
 
-Filter::Filter(const QString &direction, guint32 highestVerdict, const QJsonObject &profile)
-    : m_direction(direction)
-    , m_path(QStringLiteral("/mdm/voicecallfilter/") + direction)
-    , m_highestVerdict(highestVerdict)
+Filter::Filter(const FilterNames &names, const QJsonObject &profile)
+    : m_names(names)
     , m_default(verdictOf(profile.value(QLatin1String("default")).toString()))
 {
     const QJsonArray rules = profile.value(QLatin1String("rules")).toArray();
@@ -118,29 +151,29 @@ void Filter::attach(Service &service)
 {
     m_service = &service;
     service.addObject(
-        m_path, interfaceName,
+        m_names.path, m_names.interface,
         {
             {QStringLiteral("GetAll"),
              [this](MethodCall &call) {
                  call.reply(g_variant_new("(uu@a(su))", contractVersion, m_default, toVariant(m_rules)));
              }},
-            {QStringLiteral("AddRule"),
+            {memberName("Add@Rule"),
              [this](MethodCall &call) {
                  addRule(call);
              }},
-            {QStringLiteral("RemoveRule"),
+            {memberName("Remove@Rule"),
              [this](MethodCall &call) {
                  removeRule(call);
              }},
-            {QStringLiteral("SetRules"),
+            {memberName("Set@Rules"),
              [this](MethodCall &call) {
                  setRules(call);
              }},
-            {QStringLiteral("ClearRules"),
+            {memberName("Clear@Rules"),
              [this](MethodCall &call) {
                  clearRules(call);
              }},
-            {QStringLiteral("SetDefaultAction"),
+            {memberName("SetDefault@Action"),
              [this](MethodCall &call) {
                  setDefault(call);
              }},
@@ -149,7 +182,7 @@ void Filter::attach(Service &service)
 
 void Filter::checkVerdict(guint32 verdict) const
 {
-    if (verdict < Block || verdict > m_highestVerdict)
+    if (verdict < Block || verdict > m_names.highestVerdict)
         throw Ofono::invalidArguments(QStringLiteral("%1 is no action here").arg(verdict));
 }
 
@@ -168,19 +201,24 @@ Filter::Rules::iterator Filter::find(const QString &imsi)
     return std::find_if(m_rules.begin(), m_rules.end(), [&](const Rule &rule) { return rule.imsi == imsi; });
 }
 
-void Filter::emitSignal(const QString &member, GVariant *arguments) const
+QString Filter::memberName(const char *pattern) const
 {
-    m_service->emitSignal(m_path, interfaceName, member, arguments);
+    return QString::fromLatin1(pattern).replace(QLatin1Char('@'), m_names.word);
+}
+
+void Filter::emitSignal(const char *pattern, GVariant *arguments) const
+{
+    m_service->emitSignal(m_names.path, m_names.interface, memberName(pattern), arguments);
 }
 
 void Filter::emitRules() const
 {
-    emitSignal(QStringLiteral("RulesChanged"), g_variant_new("(@a(su))", toVariant(m_rules)));
+    emitSignal("@RulesChanged", g_variant_new("(@a(su))", toVariant(m_rules)));
 }
 
-void Filter::emitRule(const QString &member, Rules::const_iterator rule) const
+void Filter::emitRule(const char *pattern, Rules::const_iterator rule) const
 {
-    emitSignal(member,
+    emitSignal(pattern,
                g_variant_new("(u@(su))", guint32(std::distance(m_rules.begin(), rule)), toVariant(*rule)));
 }
 
@@ -193,10 +231,10 @@ void Filter::addRule(MethodCall &call)
     const auto known = find(rule.imsi);
     if (known == m_rules.end()) {
         m_rules.push_back(rule);
-        emitRule(QStringLiteral("RuleAdded"), std::prev(m_rules.cend()));
+        emitRule("@RuleAdded", std::prev(m_rules.cend()));
     } else if (known->verdict != rule.verdict) {
         known->verdict = rule.verdict;
-        emitRule(QStringLiteral("RuleChanged"), known);
+        emitRule("@RuleChanged", known);
     }
 }
 
@@ -210,7 +248,7 @@ void Filter::removeRule(MethodCall &call)
 
     const auto index = guint32(std::distance(m_rules.begin(), known));
     m_rules.erase(known);
-    emitSignal(QStringLiteral("RuleRemoved"), g_variant_new("(u)", index));
+    emitSignal("@RuleRemoved", g_variant_new("(u)", index));
 }
 
 void Filter::setRules(MethodCall &call)
@@ -255,17 +293,24 @@ void Filter::setDefault(MethodCall &call)
     call.reply();
     if (verdict != m_default) {
         m_default = verdict;
-        emitSignal(QStringLiteral("DefaultActionChanged"), g_variant_new("(u)", verdict));
+        emitSignal("Default@ActionChanged", g_variant_new("(u)", verdict));
     }
 }
 
-QJsonObject Filter::describe() const
+void Filter::describe(QJsonObject &state) const
 {
     QJsonArray rules;
     for (const Rule &rule : m_rules)
         rules << QJsonObject{{QStringLiteral("imsi"), rule.imsi},
                              {QStringLiteral("action"), word(rule.verdict)}};
-    return {{QStringLiteral("default"), word(m_default)}, {QStringLiteral("rules"), rules}};
+    const QJsonObject part{{QStringLiteral("default"), word(m_default)}, {QStringLiteral("rules"), rules}};
+    if (m_names.member.isEmpty()) {
+        state.insert(m_names.group, part);
+        return;
+    }
+    QJsonObject group = state.value(m_names.group).toObject();
+    group.insert(m_names.member, part);
+    state.insert(m_names.group, group);
 }
 
 QString Filter::judge(const QString &imsi) const
@@ -278,10 +323,10 @@ QString Filter::judge(const QString &imsi) const
         .arg(word(rule->verdict), QString::number(std::distance(m_rules.begin(), rule)), imsi);
 }
 
-class VoiceCallFilter : public Component
+class RuleFilters : public Component
 {
 public:
-    VoiceCallFilter(const QJsonObject &profile, Phone &phone);
+    RuleFilters(const QJsonObject &profile, Phone &phone);
 
     void attach(Service &service) override;
     void detach() override;
@@ -292,38 +337,35 @@ private:
     QString imsiFor(const QString &imsiOrSlot) const;
 
     const Phone &m_phone;
-    std::array<Filter, 2> m_filters;
+    std::vector<Filter> m_filters;
 };
 
-VoiceCallFilter::VoiceCallFilter(const QJsonObject &profile, Phone &phone)
+RuleFilters::RuleFilters(const QJsonObject &profile, Phone &phone)
     : m_phone(phone)
-    , m_filters{
-          Filter(QStringLiteral("dial"), Allow, profile.value(QLatin1String("dial")).toObject()),
-          Filter(QStringLiteral("incoming"), HangUp, profile.value(QLatin1String("incoming")).toObject())}
 {
+    for (const FilterNames &names : allFilters)
+        m_filters.emplace_back(names, partOf(profile, names));
 }
 
-void VoiceCallFilter::attach(Service &service)
+void RuleFilters::attach(Service &service)
 {
     for (Filter &filter : m_filters)
         filter.attach(service);
 }
 
-void VoiceCallFilter::detach()
+void RuleFilters::detach()
 {
     for (Filter &filter : m_filters)
         filter.detach();
 }
 
-void VoiceCallFilter::describe(QJsonObject &state) const
+void RuleFilters::describe(QJsonObject &state) const
 {
-    QJsonObject part;
     for (const Filter &filter : m_filters)
-        part.insert(filter.direction(), filter.describe());
-    state.insert(QStringLiteral("callFilters"), part);
+        filter.describe(state);
 }
 
-QString VoiceCallFilter::imsiFor(const QString &imsiOrSlot) const
+QString RuleFilters::imsiFor(const QString &imsiOrSlot) const
 {
     const std::optional<std::size_t> slot = m_phone.slotNumbered(imsiOrSlot);
     if (!slot)
@@ -335,12 +377,14 @@ QString VoiceCallFilter::imsiFor(const QString &imsiOrSlot) const
     return sim.imsi;
 }
 
-std::vector<Action> VoiceCallFilter::actions()
+std::vector<Action> RuleFilters::actions()
 {
     std::vector<Action> actions;
     for (const Filter &filter : m_filters) {
-        actions.push_back({QStringLiteral("call ") + filter.direction(), QStringLiteral("IMSI|SLOT [NUMBER]"),
-                           QStringLiteral("tells what happens to such a call over that SIM, and why"), 1, 2,
+        const FilterNames &names = filter.names();
+        const int most = names.actionUsage.count(QLatin1Char(' ')) + 1;
+        actions.push_back({names.action, names.actionUsage,
+                           QStringLiteral("tells what happens to %1, and why").arg(names.traffic), 1, most,
                            [this, &filter](const QStringList &arguments) {
                                return filter.judge(imsiFor(arguments.first()));
                            }});
@@ -350,17 +394,17 @@ std::vector<Action> VoiceCallFilter::actions()
 
 QString problemOf(const QJsonObject &profile)
 {
-    const QJsonObject filters = profile.value(QLatin1String("callFilters")).toObject();
-    for (auto filter = filters.begin(); filter != filters.end(); ++filter) {
+    for (const FilterNames &names : allFilters) {
         QSet<QString> seen;
-        const QJsonArray rules = filter.value().toObject().value(QLatin1String("rules")).toArray();
+        const QJsonArray rules = partOf(profile, names).value(QLatin1String("rules")).toArray();
         for (int i = 0; i < rules.size(); ++i) {
             const QString imsi = rules.at(i).toObject().value(QLatin1String("imsi")).toString();
             if (seen.contains(imsi)) {
+                const QString path
+                    = names.member.isEmpty() ? names.group : names.group + QLatin1Char('/') + names.member;
                 return QStringLiteral(
-                           "/callFilters/%1/rules/%2/imsi: there is a rule for %3 already; one rule an "
-                           "IMSI is allowed")
-                    .arg(filter.key(), QString::number(i), imsi);
+                           "/%1/rules/%2/imsi: there is a rule for %3 already; one rule an IMSI is allowed")
+                    .arg(path, QString::number(i), imsi);
             }
             seen.insert(imsi);
         }
@@ -370,10 +414,7 @@ QString problemOf(const QJsonObject &profile)
 
 const ComponentRegistration registration({
     Ofono::serviceName,
-    [](const QJsonObject &profile, Phone &phone) {
-        return std::make_unique<VoiceCallFilter>(profile.value(QLatin1String("callFilters")).toObject(),
-                                                 phone);
-    },
+    [](const QJsonObject &profile, Phone &phone) { return std::make_unique<RuleFilters>(profile, phone); },
     problemOf,
 });
 

@@ -1,0 +1,141 @@
+// SPDX-License-Identifier: LGPL-2.1-or-later
+#include "phone.h"
+#include "signalsequence.h"
+#include "waiting.h"
+
+#include <corvanemdm/siminfo.h>
+#include <corvanemdm/simvoicecallfilter.h>
+
+#include <QtCore/QElapsedTimer>
+#include <QtCore/QFile>
+#include <QtCore/QRandomGenerator>
+#include <QtTest/QtTest>
+
+using Corvane::Mdm::SimFilter;
+using Corvane::Mdm::SimInfo;
+using Corvane::Mdm::SimVoiceCallFilter;
+
+namespace
+{
+
+const QString Service = QStringLiteral("org.ofono");
+const QStringList Expected{
+    QStringLiteral("/ril_0 present voice data enabled pin:0 net:1 244051234567890"),
+    QStringLiteral("/ril_1 present enabled pin:0 net:1 262021234567891"),
+};
+constexpr int Restarts = 100;
+constexpr quint32 Seed = 20261121;
+constexpr int LongestRunMicroseconds = 40000; // somewhat longer than until all states are known
+
+QStringList stateTexts(const SimInfo &info)
+{
+    QStringList result;
+    const QList<SimInfo::SimState> states = info.simSlotStates();
+    for (const SimInfo::SimState &state : states)
+        result.append(simStateText(state));
+    return result;
+}
+
+/** Memory of this process that is in use, in KiB. */
+qint64 residentMemory()
+{
+    QFile status(QStringLiteral("/proc/self/statm"));
+    if (!status.open(QIODevice::ReadOnly))
+        return 0;
+    return status.readAll().split(' ').value(1).toLongLong() * 4;
+}
+
+void runFor(int microseconds)
+{
+    QElapsedTimer elapsed;
+    elapsed.start();
+    while (elapsed.nsecsElapsed() < qint64(microseconds) * 1000)
+        QCoreApplication::processEvents();
+}
+
+/** Whether both slots have come to their states; before that the ones of the run before are kept. */
+bool isTakenUp(const QStringList &signalsSeen)
+{
+    for (const QString &state : Expected) {
+        if (!signalsSeen.contains(QStringLiteral("simStateChanged(%1)").arg(state)))
+            return false;
+    }
+    return true;
+}
+
+} // namespace
+
+/** The telephony service goes away at moments that nobody chose, the same ones in every run of the test. */
+class TelephonyRestartsTest : public QObject
+{
+    Q_OBJECT
+
+private Q_SLOTS:
+    void objectsSurvive();
+};
+
+void TelephonyRestartsTest::objectsSurvive()
+{
+    Phone phone;
+    QRandomGenerator random(Seed);
+
+    SimInfo info;
+    SimVoiceCallFilter filter;
+    QVERIFY(waitUntil([&] { return filter.ready() && stateTexts(info) == Expected; }));
+    QVERIFY(filter.setDialRule({QStringLiteral("244051234567890"), SimFilter::Block}));
+    QVERIFY(waitUntil([&] { return filter.dialRules().size() == 1; }));
+    const SimFilter::RuleList rules = filter.dialRules();
+
+    SignalSequence seen(&info);
+    int cutShort = 0;
+    qint64 slowest = 0;
+    qint64 memoryAtStart = 0;
+    for (int round = 0; round < Restarts; ++round) {
+        phone.stopService(Service);
+        QVERIFY(waitUntil([&] { return !info.available(); }));
+        QCOMPARE(info.simSlotStates().size(), 2);
+        QVERIFY(filter.ready());
+        QCOMPARE(filter.dialRules(), rules);
+        runFor(random.bounded(LongestRunMicroseconds / 4));
+
+        // A run that ends at any point of taking up the service...
+        seen.take();
+        phone.startService(Service);
+        runFor(random.bounded(LongestRunMicroseconds));
+        cutShort += isTakenUp(seen.take()) ? 0 : 1;
+        phone.stopService(Service);
+        runFor(random.bounded(LongestRunMicroseconds / 4));
+
+        // ... and one that lasts.
+        seen.take();
+        phone.startService(Service);
+        QElapsedTimer elapsed;
+        elapsed.start();
+        QVERIFY2(waitUntil([&] { return isTakenUp(seen.signalsSeen()); }),
+                 qPrintable(seen.take().join(QLatin1Char('\n'))));
+        slowest = qMax(slowest, elapsed.elapsed());
+        phone.settle(Service);
+        QCOMPARE(stateTexts(info), Expected);
+        QCOMPARE(filter.dialRules(), rules);
+        QVERIFY(filter.ready());
+
+        // The objects still work: what happens now is told once.
+        seen.take();
+        phone.act(QStringLiteral("network"), {QStringLiteral("1"), QStringLiteral("roaming")});
+        QVERIFY(seen.waitFor(1));
+        phone.act(QStringLiteral("network"), {QStringLiteral("1"), QStringLiteral("registered")});
+        QVERIFY(seen.waitFor(2));
+        phone.settle(Service);
+        QCOMPARE(seen.take().size(), 2);
+        if (round == Restarts / 10)
+            memoryAtStart = residentMemory();
+    }
+    qInfo("%d restarts (seed %u), %d runs of the service cut short while it was taken up, slowest return to "
+          "all "
+          "states %lld ms, memory %+lld KiB since restart %d",
+          2 * Restarts, Seed, cutShort, slowest, residentMemory() - memoryAtStart, Restarts / 10);
+}
+
+QTEST_GUILESS_MAIN(TelephonyRestartsTest)
+
+#include "telephonyrestarts_test.moc"
