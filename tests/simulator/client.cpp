@@ -96,7 +96,7 @@ Client::Client()
 
 Client::~Client()
 {
-    // A call that is not answered must not outlive its connection.
+    // QtDBus corrupts memory when a connection is closed under a call that is still waited for.
     qDeleteAll(findChildren<QDBusPendingCallWatcher *>());
     QDBusConnection::disconnectFromBus(m_connectionName);
 }
@@ -158,9 +158,6 @@ bool Client::waitForSignals(int count) const
 
 QStringList Client::takeSignals(const QString &service)
 {
-    // A service may signal on after it has answered: that is over when the phone answers, and taken in when
-    // the service has answered once more.
-    control(QStringLiteral("Services"));
     call(service, QStringLiteral("/"), QStringLiteral("org.freedesktop.DBus.Peer"), QStringLiteral("Ping"));
     return std::exchange(m_signals, {});
 }
