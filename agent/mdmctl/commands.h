@@ -16,6 +16,7 @@ Command callsCommand();
 Command smsCommand();
 Command dataCommand();
 Command callStatisticsCommand();
+Command simCommand();
 Command policyCommand();
 
 // Options that commands share.

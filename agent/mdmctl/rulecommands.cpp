@@ -99,11 +99,12 @@ Table rulesTable()
 
 int runShow(RuleFilter &filter, const Values &values)
 {
+    const RuleFamily family = filter.family();
     Table table = rulesTable();
     QJsonObject json;
-    for (const Traffic traffic : filter.family().traffic) {
+    for (const Traffic traffic : family.traffic) {
         addRow(&table, filter, traffic);
-        if (filter.family().hasDirections())
+        if (family.hasDirections())
             json.insert(directionName(traffic), trafficJson(filter, traffic));
         else
             json = trafficJson(filter, traffic);

@@ -2,7 +2,6 @@
 #include "rulesection.h"
 
 #include "schemaexplanation.h"
-#include "wait.h"
 
 namespace Corvane
 {
@@ -47,13 +46,14 @@ QJsonObject RuleSection::wantedFor(Traffic traffic, const QJsonObject &wanted) c
     return m_family.hasDirections() ? wanted.value(directionName(traffic)).toObject() : wanted;
 }
 
-bool RuleSection::namesEverySim(const QJsonObject &wanted) const
+bool RuleSection::namesSim(const QJsonObject &wanted,
+                           const std::function<bool(const QString &imsi)> &predicate) const
 {
     for (const Traffic traffic : m_family.traffic) {
         const SimFilter::RuleList rules
             = rulesFromJson(wantedFor(traffic, wanted).value(rulesMember).toArray());
         for (const SimFilter::Rule &rule : rules) {
-            if (rule.imsi == AnySim)
+            if (predicate(rule.imsi))
                 return true;
         }
     }
@@ -113,27 +113,32 @@ Reply RuleSection::open(const QJsonObject &wanted)
     if (!opened.isDone())
         return opened;
     connect(m_filter.get(), &RuleFilter::changed, this, &RuleSection::drifted);
-    return namesEverySim(wanted) ? openSims() : Reply{};
+    const auto isAnySim = [](const QString &imsi) {
+        return imsi == AnySim;
+    };
+    if (!namesSim(wanted, [](const QString &) { return true; }))
+        return {};
+    const Reply told = openSims();
+    m_simsAreTold = told.isDone();
+    // A rule for a named SIM needs no look at the slots.
+    return m_simsAreTold || !namesSim(wanted, isAnySim) ? Reply{} : told;
 }
 
 Reply RuleSection::openSims()
 {
-    m_sims = std::make_unique<SimsOfPhone>();
-    Wait wait(service(), m_timeout, QStringLiteral("tell which SIMs are in the phone"));
-    wait.until(m_sims.get(), &SimsOfPhone::changed, [this] { return m_sims->isReady(); });
-    const Reply known = wait.run();
-    if (!known.isDone())
-        return known;
-    if (!m_sims->error().isEmpty())
-        return {Reply::Refused, QStringLiteral("the SIMs of the phone are not known: ") + m_sims->error()};
-    connect(m_sims.get(), &SimsOfPhone::changed, this, &RuleSection::drifted);
-    return {};
+    m_sims = std::make_unique<SimCards>(m_timeout);
+    const Reply told = m_sims->ask();
+    if (told.outcome == Reply::Refused)
+        return {Reply::Refused, QStringLiteral("the SIMs of the phone are not known: ") + told.text};
+    connect(m_sims.get(), &SimCards::changed, this, &RuleSection::drifted);
+    return told;
 }
 
 void RuleSection::close()
 {
     m_filter.reset();
     m_sims.reset();
+    m_simsAreTold = false;
 }
 
 QVector<Setting> RuleSection::compare(const QJsonObject &wanted)
@@ -162,14 +167,27 @@ Setting RuleSection::compareDefault(Setting setting, Traffic traffic) const
 Setting RuleSection::compareRules(Setting setting, Traffic traffic) const
 {
     const SimFilter::RuleList present = m_filter->rules(traffic);
-    const SimFilter::RuleList wanted = expandedRules(rulesFromJson(setting.wanted.json.toArray()),
-                                                     m_sims ? m_sims->imsis() : QStringList());
+    const QStringList imsis = m_simsAreTold ? m_sims->imsis() : QStringList();
+    const SimFilter::RuleList wanted = expandedRules(rulesFromJson(setting.wanted.json.toArray()), imsis);
     const RuleDifference difference(present, wanted);
     setting.present = rulesValue(present);
     setting.wanted = rulesValue(wanted);
     setting.status = difference.isEmpty() ? Setting::Compliant : Setting::Different;
-    setting.detail = difference.toString();
+    QStringList details{difference.toString(), absentSimsText(wanted, imsis)};
+    details.removeAll(QString());
+    setting.detail = details.join(QLatin1String("; "));
     return setting;
+}
+
+QString RuleSection::absentSimsText(const SimFilter::RuleList &wanted, const QStringList &present) const
+{
+    // The phone keeps such rules, so that the setting is as wanted; but they may be a mistake.
+    QStringList notes;
+    for (const SimFilter::Rule &rule : wanted) {
+        if (m_simsAreTold && !present.contains(rule.imsi))
+            notes.append(QStringLiteral("no SIM %1 in the phone").arg(rule.imsi));
+    }
+    return notes.join(QLatin1String("; "));
 }
 
 Reply RuleSection::change(const Setting &setting)

@@ -4,9 +4,10 @@
 
 #include "policysection.h"
 #include "rulefilter.h"
-#include "simsofphone.h"
+#include "simcards.h"
 
 #include <chrono>
+#include <functional>
 #include <memory>
 
 namespace Corvane
@@ -42,12 +43,15 @@ private:
     QString pathOf(Traffic traffic, QLatin1String member) const;
     /** What @p wanted, the section's member of a policy, has about @p traffic. */
     QJsonObject wantedFor(Traffic traffic, const QJsonObject &wanted) const;
-    bool namesEverySim(const QJsonObject &wanted) const;
+    bool namesSim(const QJsonObject &wanted, const std::function<bool(const QString &imsi)> &predicate) const;
+    /** Tells of rules for SIMs that are elsewhere. */
+    QString absentSimsText(const Mdm::SimFilter::RuleList &wanted, const QStringList &present) const;
 
     const RuleFamily m_family;
     const std::chrono::milliseconds m_timeout;
     std::unique_ptr<RuleFilter> m_filter;
-    std::unique_ptr<SimsOfPhone> m_sims; // only for a policy with a rule for every SIM
+    std::unique_ptr<SimCards> m_sims; // only for a policy with rules
+    bool m_simsAreTold = false;
 };
 
 } // namespace Agent

@@ -41,8 +41,9 @@ constexpr char StatusKept[] = "Status"; // the same as a property of the interfa
 
 const QLatin1String RebootWarningKey("/desktop/dapple-tevrik-home/reboot_warning_on_sim_remove");
 
-const char *const modemPropertySlot = SLOT(modemPropertyChanged(QString, QDBusVariant));
-const char *const registrationPropertySlot = SLOT(networkRegistrationPropertyChanged(QString, QDBusVariant));
+const char *const modemPropertySlot = SLOT(modemPropertyChanged(QString, QDBusVariant, QDBusMessage));
+const char *const registrationPropertySlot
+    = SLOT(networkRegistrationPropertyChanged(QString, QDBusVariant, QDBusMessage));
 
 SimInfo::NetworkRegistrationStatus registrationStatus(const QString &status)
 {
@@ -394,9 +395,10 @@ void SimInfoPrivate::modemGetPropertiesFinished(QDBusPendingCallWatcher *watcher
         modemInterfacesChanged(path, reply.value().value(InterfacesProperty).toStringList());
 }
 
-void SimInfoPrivate::modemPropertyChanged(const QString &name, const QDBusVariant &value)
+void SimInfoPrivate::modemPropertyChanged(const QString &name, const QDBusVariant &value,
+                                          const QDBusMessage &message)
 {
-    const QString path = message().path();
+    const QString path = message.path();
     if (name == InterfacesProperty && m_modemInterfaces.contains(path))
         modemInterfacesChanged(path, value.variant().toStringList());
 }
@@ -419,9 +421,10 @@ void SimInfoPrivate::networkRegistrationGetPropertiesFinished(QDBusPendingCallWa
     updateSimState(registration->path());
 }
 
-void SimInfoPrivate::networkRegistrationPropertyChanged(const QString &name, const QDBusVariant &value)
+void SimInfoPrivate::networkRegistrationPropertyChanged(const QString &name, const QDBusVariant &value,
+                                                        const QDBusMessage &message)
 {
-    QDBusInterface *registration = m_registrationInterfaces.value(message().path());
+    QDBusInterface *registration = m_registrationInterfaces.value(message.path());
     if (name != StatusProperty || !registration)
         return;
     registration->setProperty(StatusKept, value.variant().toString());

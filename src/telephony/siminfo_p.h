@@ -12,8 +12,8 @@
 #include <QtCore/QMap>
 #include <QtCore/QPointer>
 #include <QtCore/QSharedPointer>
-#include <QtDBus/QDBusContext>
 #include <QtDBus/QDBusInterface>
+#include <QtDBus/QDBusMessage>
 #include <QtDBus/QDBusPendingCallWatcher>
 #include <QtDBus/QDBusVariant>
 
@@ -23,7 +23,7 @@ namespace Mdm
 {
 
 /** Follows the modems and keeps the states. A receiver of its signals may delete it at any of them. */
-class SimInfoPrivate : public QObject, protected QDBusContext
+class SimInfoPrivate : public QObject
 {
     Q_OBJECT
 
@@ -46,9 +46,11 @@ private Q_SLOTS:
     /** Of the modem whose SIM object sends the signal. */
     void updateSimState();
 
-    void modemPropertyChanged(const QString &name, const QDBusVariant &value);
+    // QtDBus adds the message, which tells the modem.
+    void modemPropertyChanged(const QString &name, const QDBusVariant &value, const QDBusMessage &message);
     void modemGetPropertiesFinished(QDBusPendingCallWatcher *watcher);
-    void networkRegistrationPropertyChanged(const QString &name, const QDBusVariant &value);
+    void networkRegistrationPropertyChanged(const QString &name, const QDBusVariant &value,
+                                            const QDBusMessage &message);
     void networkRegistrationGetPropertiesFinished(QDBusPendingCallWatcher *watcher);
 
 private:

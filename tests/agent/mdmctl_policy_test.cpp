@@ -30,9 +30,9 @@ QJsonObject json(const QByteArray &text)
 /** What is left of @p calls without those that only look. */
 QStringList withoutQueries(QStringList calls)
 {
-    static const QRegularExpression query(QStringLiteral(
-        " (GetAll|GetModems|GetProperties|registerClient|unregisterClient|softwareUpdateIsAvailable|"
-        "latestAvailableUpdateVersion) "));
+    static const QRegularExpression query(
+        QStringLiteral(" (Get[A-Za-z]+|registerClient|unregisterClient|softwareUpdateIsAvailable|"
+                       "latestAvailableUpdateVersion) "));
     for (int i = calls.size() - 1; i >= 0; --i) {
         if (query.match(calls.at(i)).hasMatch())
             calls.removeAt(i);
@@ -77,6 +77,7 @@ private Q_SLOTS:
     void applyMakesThePhoneSoOnce();
     void everySimIsExpanded();
     void unknownSimsFailTheSetting();
+    void absentSimsAreNoted();
     void failingSettingDoesNotStopTheOthers();
     void silentServiceFailsTheSetting();
     void missingServiceIsUnsupported();
@@ -182,7 +183,7 @@ void MdmctlPolicyTest::checkReportsAndChangesNothing()
     QCOMPARE(checked.json(), json(R"({"policy": "Test", "compliant": false, "settings": [
         {"path": "calls.dial.default", "status": "different", "present": "allow", "wanted": "block", "detail": ""},
         {"path": "calls.dial.rules", "status": "different", "present": [{"imsi": "1", "action": "block"}],
-         "wanted": [{"imsi": "2", "action": "allow"}], "detail": "add 2=allow; remove 1"},
+         "wanted": [{"imsi": "2", "action": "allow"}], "detail": "add 2=allow; remove 1; no SIM 2 in the phone"},
         {"path": "calls.incoming.default", "status": "compliant", "present": "allow", "wanted": "allow", "detail": ""},
         {"path": "softwareUpdate.install", "status": "compliant", "present": null, "wanted": "latest", "detail": ""}
         ]})"));
@@ -201,6 +202,8 @@ void MdmctlPolicyTest::checkAsATable()
                             "calls.dial.default  compliant  allow     allow\n"
                             "calls.dial.rules    different  no rules  1=block  add 1=block\n"
                             "                                         2=allow  add 2=allow\n"
+                            "                                                  no SIM 1 in the phone\n"
+                            "                                                  no SIM 2 in the phone\n"
                             "\n"
                             "Test: 1 compliant, 1 different.\n"));
 }
@@ -302,6 +305,7 @@ void MdmctlPolicyTest::applyMakesThePhoneSoOnce()
                             "calls.dial.default      changed    allow     block\n"
                             "calls.dial.rules        changed    9=block   1=allow   add 1=allow\n"
                             "                                                       remove 9\n"
+                            "                                                       no SIM 1 in the phone\n"
                             "calls.incoming.default  changed    allow     hangup\n"
                             "calls.incoming.rules    compliant  no rules  no rules\n"
                             "\n"
@@ -333,18 +337,40 @@ void MdmctlPolicyTest::everySimIsExpanded()
 
 void MdmctlPolicyTest::unknownSimsFailTheSetting()
 {
-    m_phone.failCalls(Ofono, QString(), QStringLiteral("GetModems"), QStringLiteral("org.ofono.Error.Failed"),
+    m_phone.failCalls(Ofono, QString(), QStringLiteral("GetIMEI"), QStringLiteral("org.ofono.Error.Failed"),
                       QStringLiteral("no modems"));
     const QByteArray everySim = R"({"calls": {"dial": {"rules": [{"imsi": "*", "action": "block"}]}}})";
     const Mdmctl::Result applied = run(QStringLiteral("apply"), everySim, {QStringLiteral("--json")});
     QCOMPARE(statuses(applied.json()), QStringLiteral("calls.dial.rules=failed"));
-    QCOMPARE(detailOf(applied.json(), 0), QStringLiteral("the SIMs of the phone are not known: no modems"));
+    QCOMPARE(detailOf(applied.json(), 0),
+             QStringLiteral("the SIMs of the phone are not known: the telephony service (org.ofono) does not "
+                            "tell its SIM slots"));
     QCOMPARE(applied.status, 1);
     QCOMPARE(withoutQueries(m_phone.takeJournal(Ofono)), QStringList());
     QCOMPARE(
         run(QStringLiteral("apply"), R"({"calls": {"dial": {"rules": [{"imsi": "1", "action": "block"}]}}})")
             .status,
         0);
+}
+
+void MdmctlPolicyTest::absentSimsAreNoted()
+{
+    const QByteArray policy = R"({"calls": {"dial": {"rules": [{"imsi": "244051234567890", "action": "block"},
+        {"imsi": "310150123456789", "action": "block"}]}}})";
+    const QString note = QStringLiteral("no SIM 310150123456789 in the phone");
+    QCOMPARE(run(QStringLiteral("apply"), policy).status, 0);
+    // The phone keeps a rule for a SIM that is elsewhere: the setting is as wanted.
+    const Mdmctl::Result checked = run(QStringLiteral("check"), policy, {QStringLiteral("--json")});
+    QCOMPARE(statuses(checked.json()), QStringLiteral("calls.dial.rules=compliant"));
+    QCOMPARE(detailOf(checked.json(), 0), note);
+    QCOMPARE(checked.status, 0);
+
+    // Where the SIMs are not known there is nothing to note.
+    m_phone.failCalls(Ofono, QString(), QStringLiteral("GetIMEI"), QStringLiteral("org.ofono.Error.Failed"),
+                      QString());
+    const Mdmctl::Result unknown = run(QStringLiteral("check"), policy, {QStringLiteral("--json")});
+    QCOMPARE(statuses(unknown.json()), QStringLiteral("calls.dial.rules=compliant"));
+    QCOMPARE(detailOf(unknown.json(), 0), QString());
 }
 
 void MdmctlPolicyTest::failingSettingDoesNotStopTheOthers()

@@ -13,6 +13,7 @@
 #include <QtDBus/QDBusVariant>
 #include <QtTest/QtTest>
 
+#include <algorithm>
 #include <memory>
 
 using Corvane::Mdm::SimInfo;
@@ -275,11 +276,13 @@ void SimInfoTest::tellsBothSlots()
     const QString unregistered0 = QString(Sim0).replace(QLatin1String("net:1"), QLatin1String("net:-1"));
     const QString unregistered1 = QString(Sim1).replace(QLatin1String("net:1"), QLatin1String("net:-1"));
     QStringList signalsSeen = seen.take();
+    QCOMPARE(signalsSeen.takeFirst(), QStringLiteral("availableChanged(true)"));
     signalsSeen.removeAll(changed(unregistered0));
     signalsSeen.removeAll(changed(unregistered1));
-    QCOMPARE(signalsSeen,
-             QStringList({QStringLiteral("availableChanged(true)"), changed(Empty0), changed(Empty1),
-                          changed(Sim0), changed(Sim1)}));
+    // Nobody says which slot's answers come first.
+    QCOMPARE(signalsSeen.filter(Modem0), QStringList({changed(Empty0), changed(Sim0)}));
+    QCOMPARE(signalsSeen.filter(Modem1), QStringList({changed(Empty1), changed(Sim1)}));
+    QCOMPARE(signalsSeen.size(), 4);
 }
 
 void SimInfoTest::tellsEverythingOfASlot()
@@ -302,7 +305,10 @@ void SimInfoTest::asksInThisOrder()
 {
     SimInfo info;
     QVERIFY(waitForStates(info, {Sim0, Sim1}));
-    const QStringList calls = m_phone->takeJournalWithInterfaces(Service);
+    QStringList calls = m_phone->takeJournalWithInterfaces(Service);
+    // Nobody says which slot's answers come first.
+    QVERIFY(calls.size() > 2);
+    std::sort(calls.end() - 2, calls.end());
     QStringList expected{
         QStringLiteral("/ org.ofono.Manager.GetModems ()"),
         QStringLiteral("/ org.veldmobile.ofono.ModemManager.GetInterfaceVersion ()"),

@@ -96,6 +96,8 @@ Client::Client()
 
 Client::~Client()
 {
+    // QtDBus corrupts memory when a connection is closed under a call that is still waited for.
+    qDeleteAll(findChildren<QDBusPendingCallWatcher *>());
     QDBusConnection::disconnectFromBus(m_connectionName);
 }
 
