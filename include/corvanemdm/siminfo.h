@@ -39,7 +39,7 @@ class CORVANEMDM_EXPORT SimInfo : public QObject
 
 public:
     /** What has to be entered before the SIM can be used. */
-    enum PinRequired {
+    enum PinRequired : int {
         UnknownPinState = -1, ///< there is no SIM, the slot is not enabled, or it has not been told yet
         PinNotRequired = 0, ///< neither PIN nor PUK
         SimPinRequired = 1, ///< the SIM's PIN
@@ -47,7 +47,7 @@ public:
     };
 
     /** How the SIM stands to the mobile network. */
-    enum NetworkRegistrationStatus {
+    enum NetworkRegistrationStatus : int {
         UnknownRegistrationStatus = -1, ///< not told
         NotRegistered = 0, ///< and not looking for a network
         Registered = 1, ///< at home
@@ -101,7 +101,9 @@ public:
     class CORVANEMDM_EXPORT SlotInfo
     {
     public:
+        /** The first slot, with nothing in it. */
         SlotInfo();
+        /** @p slotValue in the slot @p slotIndex. */
         SlotInfo(int slotIndex, const QString &slotValue);
 
         /** "Slot(0) = (244051234567890)". */

@@ -252,7 +252,8 @@ EmulatedModems::~EmulatedModems() = default;
 std::map<std::string, std::string> EmulatedModems::prepare()
 {
     std::ofstream file(configurationFile);
-    for (std::size_t slot = 0; slot < m_slots.size(); ++slot) {
+    // oFono lists first what comes last.
+    for (std::size_t slot = m_slots.size(); slot-- > 0;) {
         file << '[' << modemName(slot).toStdString()
              << "]\nDriver=phonesim\nAddress=127.0.0.1\nPort=" << m_slots[slot]->port.number() << "\n\n";
     }

@@ -172,7 +172,7 @@ void requireService(const Phone &phone, const std::string &name)
 {
     const std::vector<std::string> known = serviceNames(phone);
     if (std::find(known.begin(), known.end(), name) == known.end()) {
-        throw Failure{Refused, "there is no simulated service \"" + name + "\"; " + advice(name, known)};
+        throw Failure{Refused, "there is no service \"" + name + "\"; " + advice(name, known)};
     }
 }
 
@@ -521,10 +521,10 @@ int main(int argc, char *argv[])
         return command;
     };
     const auto forService = [&](CLI::App *command) {
-        command->add_option("SERVICE", service, "bus name of a simulated service")->required();
+        command->add_option("SERVICE", service, "bus name of a service")->required();
     };
 
-    add("services", "list the simulated services", showServices);
+    add("services", "list the services that can be steered", showServices);
     forService(add("stop", "stop a service, as if it had died", [&](Phone &phone) {
         requireService(phone, service);
         phone.call("StopService", g_variant_new("(s)", service.c_str()));
@@ -549,7 +549,7 @@ int main(int argc, char *argv[])
     setting->add_option("KIND", fault.kind, "error, late, never or reply")
         ->required()
         ->check(CLI::IsMember({"error", "late", "never", "reply"}));
-    setting->add_option("SERVICE", fault.service, "bus name of a simulated service")->required();
+    setting->add_option("SERVICE", fault.service, "bus name of a service")->required();
     setting->add_option("MEMBER", fault.member, "name of the method; \"\" for all")->required();
     setting->add_option("--path", fault.path, "only calls of this object");
     setting->add_option("--interface", fault.interface, "only calls of this interface");

@@ -85,9 +85,11 @@ QString textOf(const QVariantList &values)
 
 } // namespace
 
-Client::Client()
-    : m_connectionName(QUuid::createUuid().toString())
-    , m_connection(QDBusConnection::connectToBus(QDBusConnection::SystemBus, m_connectionName))
+Client::Client(Connection connection)
+    : m_connectionName(connection == Own ? QUuid::createUuid().toString() : QString())
+    , m_connection(connection == Own
+                       ? QDBusConnection::connectToBus(QDBusConnection::SystemBus, m_connectionName)
+                       : QDBusConnection::systemBus())
 {
     qDBusRegisterMetaType<WireRule>();
     qDBusRegisterMetaType<WireRules>();
@@ -96,9 +98,10 @@ Client::Client()
 
 Client::~Client()
 {
-    // A call that is not answered must not outlive its connection.
+    // QtDBus corrupts memory when a connection is closed under a call that is still waited for.
     qDeleteAll(findChildren<QDBusPendingCallWatcher *>());
-    QDBusConnection::disconnectFromBus(m_connectionName);
+    if (!m_connectionName.isEmpty())
+        QDBusConnection::disconnectFromBus(m_connectionName);
 }
 
 QString Client::uniqueName() const
@@ -112,8 +115,11 @@ QDBusMessage Client::call(const QString &service, const QString &path, const QSt
     QDBusMessage message = QDBusMessage::createMethodCall(service, path, interface, member);
     message.setArguments(arguments);
     QDBusPendingCallWatcher watcher(m_connection.asyncCall(message));
-    // By the event loop: signals that come before the answer must not stay behind it.
-    waitUntil([&] { return watcher.isFinished(); });
+    // Not isFinished(), which is true as soon as QtDBus's thread has the answer: signals that came before it
+    // must not stay behind.
+    bool finished = false;
+    connect(&watcher, &QDBusPendingCallWatcher::finished, &watcher, [&finished] { finished = true; });
+    waitUntil([&finished] { return finished; });
     return watcher.reply();
 }
 
@@ -158,10 +164,15 @@ bool Client::waitForSignals(int count) const
 
 QStringList Client::takeSignals(const QString &service)
 {
-    // A service may signal on after it has answered: that is over when the phone answers, and taken in when
-    // the service has answered once more.
+    const auto ping = [&] {
+        call(service, QStringLiteral("/"), QStringLiteral("org.freedesktop.DBus.Peer"),
+             QStringLiteral("Ping"));
+    };
+    // Pings are answered past the queue in which calls wait for the services; the control interface shares
+    // that.
+    ping();
     control(QStringLiteral("Services"));
-    call(service, QStringLiteral("/"), QStringLiteral("org.freedesktop.DBus.Peer"), QStringLiteral("Ping"));
+    ping();
     return std::exchange(m_signals, {});
 }
 

@@ -31,7 +31,11 @@ class Client : public QObject
     Q_OBJECT
 
 public:
-    Client();
+    /** Connections that come and go race in QtDBus itself: one of its own is for clients that are told apart
+     * by it. */
+    enum Connection { Shared, Own };
+
+    explicit Client(Connection connection = Shared);
     ~Client() override;
 
     QString uniqueName() const;
@@ -57,7 +61,7 @@ private Q_SLOTS:
     void note(const QDBusMessage &signal);
 
 private:
-    const QString m_connectionName;
+    const QString m_connectionName; ///< empty: shared
     QDBusConnection m_connection;
     QStringList m_signals;
 };

@@ -115,6 +115,8 @@ void RuleFiltersServiceTest::init()
     m_client->watch(
         service, object.path, object.interface,
         names({"@RuleAdded", "@RuleChanged", "@RuleRemoved", "@RulesChanged", "Default@ActionChanged"}));
+    // What came of the two calls may still be on its way.
+    takeSignals();
 }
 
 void RuleFiltersServiceTest::cleanup()

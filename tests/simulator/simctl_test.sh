@@ -27,7 +27,7 @@ says 0 $'.*org.ofono               stopped' services
 says 0 '' start org.ofono
 says 0 '' restart org.ofono
 says 0 $'.*org.ofono               running' services
-says 1 'corvane-simctl: there is no simulated service "org.ofon"; did you mean "org.ofono"\?' stop org.ofon
+says 1 'corvane-simctl: there is no service "org.ofon"; did you mean "org.ofono"\?' stop org.ofon
 
 says 0 'fault 1' fault error org.ofono GetAll --error a.b.C --message "No way" --times 1
 says 0 $'1  error  org.ofono  \\*  \\*  GetAll  \\{\'error\': <\'a.b.C\'>, \'message\': <\'No way\'>, \'times\': <uint32 1>\\}' faults

@@ -91,7 +91,7 @@ private:
 
 void SoftwareUpdateServiceTest::init()
 {
-    m_client = std::make_unique<Client>();
+    m_client = std::make_unique<Client>(Client::Own);
     watchAll(*m_client);
     m_client->control(QStringLiteral("StopService"), {service});
     m_client->control(QStringLiteral("StartService"), {service});
@@ -209,7 +209,7 @@ void SoftwareUpdateServiceTest::answersBeforeItSignals()
 
 void SoftwareUpdateServiceTest::tellsRegisteredClientsOnly()
 {
-    Client stranger;
+    Client stranger(Client::Own);
     watchAll(stranger);
     check();
     QCOMPARE(stranger.takeSignals(service), QStringList());
@@ -234,7 +234,7 @@ void SoftwareUpdateServiceTest::countsRegistrations()
 
 void SoftwareUpdateServiceTest::forgetsClientsThatLeave()
 {
-    auto leaver = std::make_unique<Client>();
+    auto leaver = std::make_unique<Client>(Client::Own);
     call(*leaver, registerClient);
     call(*leaver, registerClient);
     QCOMPARE(state().value(QLatin1String("clients")).toInt(), 2);
