@@ -238,7 +238,8 @@ phones_nest() {
 on_terminal() { # COMMAND; reads "WAIT_FOR<tab>TYPE" lines
     local wanted typed seen='' character
     terminal_text=''
-    coproc terminal { exec script -qec "$1" /dev/null 2>&1; }
+    # The shell that runs it must not stay between the terminal and the command: Control-C would end it as well.
+    coproc terminal { exec script -qec "exec $1" /dev/null 2>&1; }
     local terminal_in=${terminal[1]} terminal_out=${terminal[0]} terminal_pid=$terminal_PID
     while IFS=$'\t' read -r wanted typed; do
         while [[ $seen != *"$wanted"* ]]; do

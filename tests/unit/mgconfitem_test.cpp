@@ -203,6 +203,15 @@ void MGConfItemTest::tellsChanges()
         QCoreApplication::postEvent(qApp, new QEvent(QEvent::User));
         return seen.size() > 2;
     }));
+    // Changes are told in the order of the writes: with one of the other key, those of this one are all here.
+    MGConfItem beside(KeyBeside);
+    int besideChanges = 0;
+    connect(&beside, &MGConfItem::valueChanged, this, [&] { ++besideChanges; });
+    QVERIFY(waitUntil([&] {
+        writeElsewhere(KeyBeside, beside.value().toInt() % 2 ? "2" : "3");
+        QCoreApplication::postEvent(qApp, new QEvent(QEvent::User));
+        return besideChanges > 0;
+    }));
     seen.clear();
     writeElsewhere(KeyBeside, "true");
     writeElsewhere(Key, "'last'");
