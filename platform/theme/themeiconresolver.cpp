@@ -20,6 +20,7 @@ namespace
 {
 
 const char *const ThemeGroup = "Icon Theme";
+const QLatin1String DefaultTheme("default");
 // The theme that every other falls back on.
 const QLatin1String FallbackTheme("hicolor");
 // In the order of preference.
@@ -242,6 +243,11 @@ private:
     QHash<QString, QSet<QString>> m_files; ///< by folder
     const QStringList m_themes;
 };
+
+ThemeIconResolver::ThemeIconResolver()
+    : ThemeIconResolver(DefaultTheme)
+{
+}
 
 ThemeIconResolver::ThemeIconResolver(const QString &theme)
     : d(new Private(theme))

@@ -21,8 +21,10 @@ public:
     /** Pixels; what a launcher shows. */
     static constexpr int LauncherSize = 128;
 
+    /** Looks in the theme "default" first, which stands for the one that the device has chosen. */
+    ThemeIconResolver();
     /** Looks in @p theme first, then in those that it inherits from. */
-    explicit ThemeIconResolver(const QString &theme = QStringLiteral("default"));
+    explicit ThemeIconResolver(const QString &theme);
     ~ThemeIconResolver();
 
     /** The absolute path of the icon that fits @p size best; empty when there is none of that name. */
