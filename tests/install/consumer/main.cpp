@@ -3,6 +3,7 @@
 #include <corvanemdm/applications.h>
 #include <corvanemdm/callstatistics.h>
 #include <corvanemdm/corvanemdm_global.h>
+#include <corvanemdm/notificationinfo.h>
 #include <corvanemdm/simfilter.h>
 #include <corvanemdm/siminfo.h>
 #include <corvanemdm/simmobiledatafilter.h>
@@ -80,6 +81,15 @@ bool applicationsWork()
         && ApplicationEntry().name().isEmpty() && operation.isSucceeded();
 }
 
+bool notificationInfoWorks()
+{
+    NotificationInfo info;
+    NotificationData data;
+    data.summary = QStringLiteral("Consumer");
+    const uint id = info.createNotification(data);
+    return id == 0 ? info.notifications().isEmpty() : info.closeNotification(id);
+}
+
 QString latestVersion()
 {
     const SoftwareUpdate update;
@@ -94,7 +104,7 @@ int main(int argc, char **argv)
 {
     QCoreApplication application(argc, argv);
     const bool works = simFilterWorks() && simVoiceCallFilterWorks() && otherFiltersWork() && simInfoWorks()
-        && callStatisticsWork() && applicationsWork();
+        && callStatisticsWork() && applicationsWork() && notificationInfoWorks();
     QTextStream(stdout) << (works ? "consumer works" : "consumer fails") << ", update: " << latestVersion()
                         << '\n';
     return works ? 0 : 1;
