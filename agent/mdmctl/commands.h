@@ -17,6 +17,10 @@ Command smsCommand();
 Command dataCommand();
 Command callStatisticsCommand();
 Command simCommand();
+Command packagesCommand();
+Command applicationsCommand();
+Command installCommand();
+Command removeCommand();
 Command policyCommand();
 
 // Options that commands share.

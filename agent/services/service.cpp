@@ -22,6 +22,11 @@ Service Service::mdmProxy()
     return {QStringLiteral("org.corvaneos.mdmproxy"), QStringLiteral("MDM proxy")};
 }
 
+Service Service::packageKit()
+{
+    return {QStringLiteral("org.freedesktop.PackageKit"), QStringLiteral("package manager")};
+}
+
 QString Service::toString() const
 {
     return QStringLiteral("the %1 (%2)").arg(description, name);

@@ -18,6 +18,7 @@ struct Service {
 
     static Service telephony();
     static Service mdmProxy();
+    static Service packageKit();
 
     /** "the telephony service (org.ofono)" */
     QString toString() const;
