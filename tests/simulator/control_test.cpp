@@ -6,6 +6,7 @@
 #include <QtCore/QElapsedTimer>
 #include <QtCore/QJsonDocument>
 #include <QtCore/QJsonObject>
+#include <QtCore/QRegularExpression>
 #include <QtCore/QXmlStreamReader>
 #include <QtDBus/QDBusArgument>
 #include <QtDBus/QDBusPendingCallWatcher>
@@ -91,6 +92,16 @@ private:
     QString control(const QString &member, const QVariantList &arguments = {}) const
     {
         return textOf(m_client->control(member, arguments));
+    }
+    /** As the phone lists them in its refusals. */
+    QString serviceNames() const
+    {
+        static const QRegularExpression name(QStringLiteral("\\(([^,()]+), (true|false)\\)"));
+        QStringList names;
+        auto matches = name.globalMatch(textOf(Client().control(QStringLiteral("Services"))));
+        while (matches.hasNext())
+            names << matches.next().captured(1);
+        return names.join(QLatin1String(", "));
     }
     QString fault(const QString &kind, const QVariantMap &options = {}, const QString &member = getAll) const
     {
@@ -191,20 +202,23 @@ void ControlTest::stopsAndStartsServices()
 {
     const QString stop = QStringLiteral("StopService");
     const QString start = QStringLiteral("StartService");
-    QCOMPARE(control(QStringLiteral("Services")),
-             QStringLiteral("reply([(org.corvaneos.mdmproxy, true), (org.ofono, true)])"));
+    const auto services = [this] {
+        return control(QStringLiteral("Services"));
+    };
+    QVERIFY(services().contains(QLatin1String("(org.corvaneos.mdmproxy, true)")));
+    QVERIFY(services().contains(QLatin1String("(org.ofono, true)")));
     // Stopping and starting what is stopped or running does nothing.
     QCOMPARE(control(start, {ofono}), done);
     QCOMPARE(control(stop, {ofono}), done);
     QCOMPARE(control(stop, {ofono}), done);
-    QCOMPARE(control(QStringLiteral("Services")),
-             QStringLiteral("reply([(org.corvaneos.mdmproxy, true), (org.ofono, false)])"));
+    QVERIFY(services().contains(QLatin1String("(org.corvaneos.mdmproxy, true)")));
+    QVERIFY(services().contains(QLatin1String("(org.ofono, false)")));
     QVERIFY(filterCall().startsWith(QLatin1String("org.freedesktop.DBus.Error.ServiceUnknown")));
     QCOMPARE(control(start, {ofono}), done);
     QCOMPARE(filterCall(), all);
 
-    const QString unknown = refused
-        + QStringLiteral("There is no service \"org.x\"; there are org.corvaneos.mdmproxy, org.ofono");
+    const QString unknown
+        = refused + QStringLiteral("There is no service \"org.x\"; there are %1").arg(serviceNames());
     QCOMPARE(control(stop, {QStringLiteral("org.x")}), unknown);
     QCOMPARE(control(start, {QStringLiteral("org.x")}), unknown);
 }
@@ -354,8 +368,8 @@ void ControlTest::refusesWrongFaults_data()
     const auto row = [](const char *name, const QVariantList &arguments, const char *sentence) {
         QTest::newRow(name) << arguments << QString::fromLatin1(sentence);
     };
-    row("service", {text, QString(), QString(), QString(), never, QVariantMap()},
-        "There is no service \"x\"; there are org.corvaneos.mdmproxy, org.ofono");
+    QTest::newRow("service") << QVariantList{text, QString(), QString(), QString(), never, QVariantMap()}
+                             << QStringLiteral("There is no service \"x\"; there are %1").arg(serviceNames());
     row("path", {ofono, text, QString(), QString(), never, QVariantMap()},
         "\"x\" is no object path; leave it empty to match all of them");
     row("interface", {ofono, QString(), text, QString(), never, QVariantMap()},
