@@ -78,18 +78,20 @@ private:
 
     Phone &m_phone;
     const SimTray m_tray;
+    ContextStore m_contexts;
     ModemList m_modems; ///< by slot
     ModemManager m_manager;
     Service *m_service = nullptr;
 };
 
-ModemList createModems(const QJsonObject &profile, const Phone &phone, const std::function<void()> &changed)
+ModemList createModems(const QJsonObject &profile, const Phone &phone, ContextStore &contexts,
+                       const std::function<void()> &changed)
 {
     ModemList modems;
     const QJsonArray slotProfiles = profile.value(QLatin1String("sims")).toArray();
     for (std::size_t slot = 0; slot < phone.sims.size(); ++slot) {
-        modems.push_back(
-            std::make_unique<Modem>(slot, phone.sims[slot], slotProfiles.at(int(slot)).toObject(), changed));
+        modems.push_back(std::make_unique<Modem>(slot, phone.sims[slot],
+                                                 slotProfiles.at(int(slot)).toObject(), contexts, changed));
     }
     return modems;
 }
@@ -97,7 +99,8 @@ ModemList createModems(const QJsonObject &profile, const Phone &phone, const std
 Modems::Modems(const QJsonObject &profile, Phone &phone)
     : m_phone(phone)
     , m_tray(phone, [this](std::size_t) { announce(); })
-    , m_modems(createModems(profile, phone, [this] { announce(); }))
+    , m_contexts(profile.value(QLatin1String("sims")).toArray())
+    , m_modems(createModems(profile, phone, m_contexts, [this] { announce(); }))
     , m_manager(m_modems, profile.value(QLatin1String("telephony")).toObject(), [this] { announce(); })
 {
     for (const std::unique_ptr<Modem> &modem : m_modems)
@@ -323,6 +326,14 @@ QString problemOf(const QJsonObject &profile)
                 .arg(slot);
         }
         seen.insert(imsi);
+
+        const QString preference = sim.value(QLatin1String("technologyPreference")).toString();
+        if (!preference.isEmpty() && preference != Modem::anyTechnology
+            && !Modem::technologiesOf(sim).contains(preference)) {
+            return QStringLiteral("/sims/%1/technologyPreference: the slot's technologies are without %2")
+                .arg(slot)
+                .arg(preference);
+        }
     }
 
     const QJsonObject telephony = profile.value(QLatin1String("telephony")).toObject();

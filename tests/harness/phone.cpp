@@ -73,6 +73,19 @@ void Phone::failCalls(const QString &service, const QString &path, const QString
              {{QStringLiteral("error"), error}, {QStringLiteral("message"), message}});
 }
 
+void Phone::failCall(int number, const QString &service, const QString &path, const QString &member,
+                     const QString &error, const QString &message)
+{
+    setFault(service, path, member, QStringLiteral("error"),
+             {{QStringLiteral("error"), error},
+              {QStringLiteral("message"), message},
+              {QStringLiteral("times"), 1u}});
+    // The newest fault comes first: this one lets those before it pass.
+    if (number > 1)
+        setFault(service, path, member, QStringLiteral("late"),
+                 {{QStringLiteral("delay"), 0u}, {QStringLiteral("times"), uint(number - 1)}});
+}
+
 void Phone::answerCalls(const QString &service, const QString &path, const QString &member,
                         const QVariantList &arguments)
 {

@@ -23,6 +23,9 @@ public:
     /** @p member fails with @p error from now on; an empty @p path stands for any. */
     void failCalls(const QString &service, const QString &path, const QString &member, const QString &error,
                    const QString &message);
+    /** Of the calls of @p member from now on, the one with @p number, from 1, fails. */
+    void failCall(int number, const QString &service, const QString &path, const QString &member,
+                  const QString &error, const QString &message);
     /** @p member is answered with @p arguments from now on. */
     void answerCalls(const QString &service, const QString &path, const QString &member,
                      const QVariantList &arguments);
