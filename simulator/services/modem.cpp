@@ -191,6 +191,8 @@ QStringList Modem::features() const
     QStringList features;
     if (hasRegistration())
         features << QStringLiteral("net");
+    if (hasUsableSim())
+        features << QStringLiteral("rat") << QStringLiteral("gprs");
     if (hasSim() && m_sim.present)
         features << QStringLiteral("sim");
     return features;
@@ -267,6 +269,20 @@ Properties Modem::registrationProperties() const
     }
     properties.push_back({QStringLiteral("Status"), fromText(status)});
     return properties;
+}
+
+CellularLinks::Links Modem::links() const
+{
+    CellularLinks::Links links;
+    if (!m_mobileData.isAttached())
+        return links;
+    const bool isRoaming = registration() == QLatin1String("roaming");
+    for (const ConnectionContext &context : m_mobileData.contexts()) {
+        if (context.isForInternet())
+            links.push_back({m_path + QLatin1Char('/') + context.name, m_sim.imsi, m_sim.provider, isRoaming,
+                             context.isActive});
+    }
+    return links;
 }
 
 Properties Modem::radioProperties() const

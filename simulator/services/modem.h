@@ -3,6 +3,7 @@
 #define CORVANE_SIMULATOR_MODEM_H
 
 #include "busconnection.h"
+#include "cellularlinks.h"
 #include "mobiledata.h"
 #include "phone.h"
 #include "properties.h"
@@ -37,6 +38,8 @@ public:
     QString imei() const;
     const Sim &sim() const { return m_sim; }
     MobileData &mobileData() { return m_mobileData; }
+    /** What the connection manager can connect. */
+    CellularLinks::Links links() const;
     /** Whether the daemon has this modem. */
     bool isThere() const { return m_isThere; }
     bool isEnabled() const { return m_isEnabled; }
@@ -47,6 +50,8 @@ public:
     void setThere(bool isThere) { m_isThere = isThere; }
     /** Also switches its power on or off. */
     void setEnabled(bool enabled);
+    /** For a modem that has no power nothing changes. */
+    void setOnline(bool isOnline) { m_isOnline = isOnline && m_isPowered; }
     /** The state of registration that it has with a SIM that can be used. */
     void setRegistration(const QString &status) { m_registration = status; }
     void setExtended(bool extended) { m_isExtended = extended; }

@@ -69,6 +69,8 @@ public:
 
 private:
     void announce();
+    void offerLinks();
+    bool switchContext(const QString &contextPath, bool isActive);
     QString lockSim(const QStringList &arguments);
     QString changeSim(const QString &slotText, const std::function<void(Sim &)> &change);
     QString chooseSim(const QStringList &arguments);
@@ -103,6 +105,13 @@ Modems::Modems(const QJsonObject &profile, Phone &phone)
     , m_modems(createModems(profile, phone, m_contexts, [this] { announce(); }))
     , m_manager(m_modems, profile.value(QLatin1String("telephony")).toObject(), [this] { announce(); })
 {
+    m_phone.cellularLinks.setActivator(
+        [this](const QString &contextPath, bool isActive) { return switchContext(contextPath, isActive); });
+    m_phone.cellularLinks.watchFlightMode([this](bool isOn) {
+        for (const std::unique_ptr<Modem> &modem : m_modems)
+            modem->setOnline(!isOn);
+        announce();
+    });
     for (const std::unique_ptr<Modem> &modem : m_modems)
         modem->setExtended(m_manager.isOffered());
 }
@@ -128,6 +137,7 @@ void Modems::attach(Service &service)
     for (const std::unique_ptr<Modem> &modem : m_modems)
         modem->attach(service);
     m_manager.attach(service);
+    offerLinks();
 }
 
 void Modems::detach()
@@ -136,6 +146,7 @@ void Modems::detach()
         modem->detach();
     m_manager.detach();
     m_service = nullptr;
+    offerLinks();
 }
 
 /** Makes every interface tell what has changed. */
@@ -146,6 +157,36 @@ void Modems::announce()
         modem->announce();
     // A default SIM is one whose IMSI has been told.
     m_manager.announceDefaults();
+    offerLinks();
+}
+
+/** Tells the connection manager what it can make networks of. */
+void Modems::offerLinks()
+{
+    CellularLinks::Links links;
+    for (const std::unique_ptr<Modem> &modem : m_modems) {
+        const CellularLinks::Links ofModem = m_service ? modem->links() : CellularLinks::Links();
+        links.insert(links.end(), ofModem.begin(), ofModem.end());
+    }
+    m_phone.cellularLinks.offer(links);
+}
+
+/** As the connection manager does. */
+bool Modems::switchContext(const QString &contextPath, bool isActive)
+{
+    const int nameBegins = contextPath.lastIndexOf(QLatin1Char('/')) + 1;
+    for (const std::unique_ptr<Modem> &modem : m_modems) {
+        if (!m_service || modem->path() != contextPath.left(nameBegins - 1))
+            continue;
+        try {
+            modem->mobileData().activate(contextPath.mid(nameBegins), isActive);
+        } catch (const MethodError &) {
+            return false;
+        }
+        announce();
+        return true;
+    }
+    return false;
 }
 
 void Modems::describe(QJsonObject &state) const
