@@ -2,6 +2,7 @@
 // Uses every public class from outside of the project. Where no service answers, it must work as well.
 #include <corvanemdm/callstatistics.h>
 #include <corvanemdm/corvanemdm_global.h>
+#include <corvanemdm/notificationinfo.h>
 #include <corvanemdm/simfilter.h>
 #include <corvanemdm/siminfo.h>
 #include <corvanemdm/simmobiledatafilter.h>
@@ -67,6 +68,15 @@ bool callStatisticsWork()
     return answers == 0;
 }
 
+bool notificationInfoWorks()
+{
+    NotificationInfo info;
+    NotificationData data;
+    data.summary = QStringLiteral("Consumer");
+    const uint id = info.createNotification(data);
+    return id == 0 ? info.notifications().isEmpty() : info.closeNotification(id);
+}
+
 QString latestVersion()
 {
     const SoftwareUpdate update;
@@ -81,7 +91,7 @@ int main(int argc, char **argv)
 {
     QCoreApplication application(argc, argv);
     const bool works = simFilterWorks() && simVoiceCallFilterWorks() && otherFiltersWork() && simInfoWorks()
-        && callStatisticsWork();
+        && callStatisticsWork() && notificationInfoWorks();
     QTextStream(stdout) << (works ? "consumer works" : "consumer fails") << ", update: " << latestVersion()
                         << '\n';
     return works ? 0 : 1;
