@@ -521,7 +521,7 @@ void ConnectionManager::announceServices()
         g_variant_new("(@a(oa{sv})@ao)", g_variant_builder_end(&services), g_variant_builder_end(&removed)));
     if (paths != told)
         m_service->emitSignal(ConnMan::managerPath, managerInterface, QStringLiteral("ServicesChanged"),
-                              change.get());
+                              g_variant_ref(change.get()));
     for (const std::unique_ptr<Network> &network : m_networks) {
         network->announce();
         if (network->isOffered() && network->isConnected())
