@@ -1,6 +1,7 @@
 // SPDX-License-Identifier: LGPL-2.1-or-later
 // Uses every public class from outside of the project. Where no service answers, it must work as well.
 #include <corvanemdm/callstatistics.h>
+#include <corvanemdm/connectivitysettings.h>
 #include <corvanemdm/corvanemdm_global.h>
 #include <corvanemdm/notificationinfo.h>
 #include <corvanemdm/simfilter.h>
@@ -39,6 +40,17 @@ bool simInfoWorks()
     // Nothing is known before the event loop has run.
     return !info.available() && info.simSlotStates().isEmpty() && text.contains(QLatin1String("roaming"))
         && QString(slot) == QLatin1String("Slot(1) = (x)");
+}
+
+bool connectivitySettingsWork()
+{
+    ConnectivitySettings settings;
+    QObject::connect(&settings, &ConnectivitySettings::wlanEnabledChanged, &settings, [] {});
+    const ConnectivitySettings mirror(ConnectivitySettings::NetworkManagerMode);
+    ConnectivitySettings::MobileNetworkAccessPointSettings accessPoint;
+    const auto twoAndThree = ConnectivitySettings::Technology2G | ConnectivitySettings::Technology3G;
+    return settings.ready() && !mirror.wlanEnabled() && int(twoAndThree) == 3 && !accessPoint.isValid()
+        && !settings.setAccessPointSettings(QStringLiteral("244120000000001"), accessPoint);
 }
 
 bool simVoiceCallFilterWorks()
@@ -91,7 +103,7 @@ int main(int argc, char **argv)
 {
     QCoreApplication application(argc, argv);
     const bool works = simFilterWorks() && simVoiceCallFilterWorks() && otherFiltersWork() && simInfoWorks()
-        && callStatisticsWork() && notificationInfoWorks();
+        && connectivitySettingsWork() && callStatisticsWork() && notificationInfoWorks();
     QTextStream(stdout) << (works ? "consumer works" : "consumer fails") << ", update: " << latestVersion()
                         << '\n';
     return works ? 0 : 1;
