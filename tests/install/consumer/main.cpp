@@ -1,5 +1,6 @@
 // SPDX-License-Identifier: LGPL-2.1-or-later
 // Uses every public class from outside of the project. Where no service answers, it must work as well.
+#include <corvanemdm/applications.h>
 #include <corvanemdm/callstatistics.h>
 #include <corvanemdm/connectivitysettings.h>
 #include <corvanemdm/corvanemdm_global.h>
@@ -80,6 +81,18 @@ bool callStatisticsWork()
     return answers == 0;
 }
 
+bool applicationsWork()
+{
+    Applications applications;
+    // Nothing but the phone's own lists tells how many there are.
+    const QList<PackageEntry> packages = applications.getInstalledPackages();
+    const QList<ApplicationEntry> entries = applications.getInstalledApplications();
+    ApplicationOperation operation;
+    QObject::connect(&operation, &ApplicationOperation::finished, &operation, [](ApplicationOperation *) {});
+    return packages.size() >= 0 && entries.size() >= 0 && !PackageEntry().isValid()
+        && ApplicationEntry().name().isEmpty() && operation.isSucceeded();
+}
+
 bool notificationInfoWorks()
 {
     NotificationInfo info;
@@ -103,7 +116,8 @@ int main(int argc, char **argv)
 {
     QCoreApplication application(argc, argv);
     const bool works = simFilterWorks() && simVoiceCallFilterWorks() && otherFiltersWork() && simInfoWorks()
-        && connectivitySettingsWork() && callStatisticsWork() && notificationInfoWorks();
+        && connectivitySettingsWork() && callStatisticsWork() && applicationsWork()
+        && notificationInfoWorks();
     QTextStream(stdout) << (works ? "consumer works" : "consumer fails") << ", update: " << latestVersion()
                         << '\n';
     return works ? 0 : 1;
