@@ -1,7 +1,9 @@
 // SPDX-License-Identifier: LGPL-2.1-or-later
 // Uses every public class from outside of the project. Where no service answers, it must work as well.
+#include <corvanemdm/applications.h>
 #include <corvanemdm/callstatistics.h>
 #include <corvanemdm/corvanemdm_global.h>
+#include <corvanemdm/notificationinfo.h>
 #include <corvanemdm/simfilter.h>
 #include <corvanemdm/siminfo.h>
 #include <corvanemdm/simmobiledatafilter.h>
@@ -67,6 +69,27 @@ bool callStatisticsWork()
     return answers == 0;
 }
 
+bool applicationsWork()
+{
+    Applications applications;
+    // Nothing but the phone's own lists tells how many there are.
+    const QList<PackageEntry> packages = applications.getInstalledPackages();
+    const QList<ApplicationEntry> entries = applications.getInstalledApplications();
+    ApplicationOperation operation;
+    QObject::connect(&operation, &ApplicationOperation::finished, &operation, [](ApplicationOperation *) {});
+    return packages.size() >= 0 && entries.size() >= 0 && !PackageEntry().isValid()
+        && ApplicationEntry().name().isEmpty() && operation.isSucceeded();
+}
+
+bool notificationInfoWorks()
+{
+    NotificationInfo info;
+    NotificationData data;
+    data.summary = QStringLiteral("Consumer");
+    const uint id = info.createNotification(data);
+    return id == 0 ? info.notifications().isEmpty() : info.closeNotification(id);
+}
+
 QString latestVersion()
 {
     const SoftwareUpdate update;
@@ -81,7 +104,7 @@ int main(int argc, char **argv)
 {
     QCoreApplication application(argc, argv);
     const bool works = simFilterWorks() && simVoiceCallFilterWorks() && otherFiltersWork() && simInfoWorks()
-        && callStatisticsWork();
+        && callStatisticsWork() && applicationsWork() && notificationInfoWorks();
     QTextStream(stdout) << (works ? "consumer works" : "consumer fails") << ", update: " << latestVersion()
                         << '\n';
     return works ? 0 : 1;
