@@ -4,6 +4,7 @@
 #include <corvanemdm/callstatistics.h>
 #include <corvanemdm/connectivitysettings.h>
 #include <corvanemdm/corvanemdm_global.h>
+#include <corvanemdm/locationinfo.h>
 #include <corvanemdm/notificationinfo.h>
 #include <corvanemdm/simfilter.h>
 #include <corvanemdm/siminfo.h>
@@ -102,6 +103,15 @@ bool notificationInfoWorks()
     return id == 0 ? info.notifications().isEmpty() : info.closeNotification(id);
 }
 
+bool locationInfoWorks()
+{
+    LocationInfo info;
+    QObject::connect(&info, &LocationInfo::positionChanged, &info, [] {});
+    // Nothing is asked for before something was requested.
+    const LocationInfo::Position position = info.position();
+    return info.satellitesInUse() == -1 && !position.timestamp.isValid() && position.latitude == 0.0;
+}
+
 QString latestVersion()
 {
     const SoftwareUpdate update;
@@ -116,8 +126,8 @@ int main(int argc, char **argv)
 {
     QCoreApplication application(argc, argv);
     const bool works = simFilterWorks() && simVoiceCallFilterWorks() && otherFiltersWork() && simInfoWorks()
-        && connectivitySettingsWork() && callStatisticsWork() && applicationsWork()
-        && notificationInfoWorks();
+        && connectivitySettingsWork() && callStatisticsWork() && applicationsWork() && notificationInfoWorks()
+        && locationInfoWorks();
     QTextStream(stdout) << (works ? "consumer works" : "consumer fails") << ", update: " << latestVersion()
                         << '\n';
     return works ? 0 : 1;
