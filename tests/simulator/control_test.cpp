@@ -6,7 +6,6 @@
 #include <QtCore/QElapsedTimer>
 #include <QtCore/QJsonDocument>
 #include <QtCore/QJsonObject>
-#include <QtCore/QRegularExpression>
 #include <QtCore/QXmlStreamReader>
 #include <QtDBus/QDBusArgument>
 #include <QtDBus/QDBusPendingCallWatcher>
@@ -92,16 +91,6 @@ private:
     QString control(const QString &member, const QVariantList &arguments = {}) const
     {
         return textOf(m_client->control(member, arguments));
-    }
-    /** As the phone lists them in its refusals. */
-    QString serviceNames() const
-    {
-        static const QRegularExpression name(QStringLiteral("\\(([^,()]+), (true|false)\\)"));
-        QStringList names;
-        auto matches = name.globalMatch(textOf(Client().control(QStringLiteral("Services"))));
-        while (matches.hasNext())
-            names << matches.next().captured(1);
-        return names.join(QLatin1String(", "));
     }
     QString fault(const QString &kind, const QVariantMap &options = {}, const QString &member = getAll) const
     {
@@ -202,25 +191,27 @@ void ControlTest::stopsAndStartsServices()
 {
     const QString stop = QStringLiteral("StopService");
     const QString start = QStringLiteral("StartService");
-    const auto services = [this] {
-        return control(QStringLiteral("Services"));
+    // Which services there are beside these is no matter of the controls.
+    const auto tells = [this](const char *service) {
+        return control(QStringLiteral("Services")).contains(QLatin1String(service));
     };
-    QVERIFY(services().contains(QLatin1String("(org.corvaneos.mdmproxy, true)")));
-    QVERIFY(services().contains(QLatin1String("(org.ofono, true)")));
+    QVERIFY(tells("(org.corvaneos.mdmproxy, true)"));
+    QVERIFY(tells("(org.ofono, true)"));
     // Stopping and starting what is stopped or running does nothing.
     QCOMPARE(control(start, {ofono}), done);
     QCOMPARE(control(stop, {ofono}), done);
     QCOMPARE(control(stop, {ofono}), done);
-    QVERIFY(services().contains(QLatin1String("(org.corvaneos.mdmproxy, true)")));
-    QVERIFY(services().contains(QLatin1String("(org.ofono, false)")));
+    QVERIFY(tells("(org.corvaneos.mdmproxy, true)"));
+    QVERIFY(tells("(org.ofono, false)"));
     QVERIFY(filterCall().startsWith(QLatin1String("org.freedesktop.DBus.Error.ServiceUnknown")));
     QCOMPARE(control(start, {ofono}), done);
     QCOMPARE(filterCall(), all);
 
-    const QString unknown
-        = refused + QStringLiteral("There is no service \"org.x\"; there are %1").arg(serviceNames());
-    QCOMPARE(control(stop, {QStringLiteral("org.x")}), unknown);
-    QCOMPARE(control(start, {QStringLiteral("org.x")}), unknown);
+    for (const QString &method : {stop, start}) {
+        const QString answer = control(method, {QStringLiteral("org.x")});
+        QVERIFY(answer.startsWith(refused + QStringLiteral("There is no service \"org.x\"; there are ")));
+        QVERIFY(answer.contains(QLatin1String("org.corvaneos.mdmproxy, ")));
+    }
 }
 
 void ControlTest::leavesCallsOfAStoppedServiceUnanswered()
@@ -368,8 +359,8 @@ void ControlTest::refusesWrongFaults_data()
     const auto row = [](const char *name, const QVariantList &arguments, const char *sentence) {
         QTest::newRow(name) << arguments << QString::fromLatin1(sentence);
     };
-    QTest::newRow("service") << QVariantList{text, QString(), QString(), QString(), never, QVariantMap()}
-                             << QStringLiteral("There is no service \"x\"; there are %1").arg(serviceNames());
+    row("service", {text, QString(), QString(), QString(), never, QVariantMap()},
+        "There is no service \"x\"; there are ");
     row("path", {ofono, text, QString(), QString(), never, QVariantMap()},
         "\"x\" is no object path; leave it empty to match all of them");
     row("interface", {ofono, QString(), text, QString(), never, QVariantMap()},
@@ -395,7 +386,8 @@ void ControlTest::refusesWrongFaults()
 {
     QFETCH(QVariantList, arguments);
     QFETCH(QString, sentence);
-    QCOMPARE(control(QStringLiteral("SetFault"), arguments), refused + sentence);
+    const QString answer = control(QStringLiteral("SetFault"), arguments);
+    QVERIFY2(answer.startsWith(refused + sentence), qPrintable(answer));
     QCOMPARE(control(QStringLiteral("Faults")), QStringLiteral("reply([])"));
 }
 

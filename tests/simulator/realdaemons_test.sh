@@ -40,7 +40,7 @@ text=$("$simulator" --real stock-ofono -- sh -c '
     corvane-simctl services' 2>&1) || status=$?
 expect "status with a daemon that dies" $status 125
 contains "message" "$text" "corvane-simulator: /usr/sbin/ofonod was ended by signal 9; stock-ofono said:"
-contains "services after that" "$(tr -s ' ' <<<"$text")" "org.ofono running"
+contains "services after that" "$(tr -s ' ' <<< "$text")" "org.ofono running"
 
 # In a phone the daemon can be taken away, by root, without anybody missing it.
 if [[ $EUID -eq 0 ]]; then
