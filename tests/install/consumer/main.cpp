@@ -1,5 +1,6 @@
 // SPDX-License-Identifier: LGPL-2.1-or-later
 // Uses every public class from outside of the project. Where no service answers, it must work as well.
+#include <corvanemdm/autostart.h>
 #include <corvanemdm/callstatistics.h>
 #include <corvanemdm/corvanemdm_global.h>
 #include <corvanemdm/simfilter.h>
@@ -67,6 +68,16 @@ bool callStatisticsWork()
     return answers == 0;
 }
 
+bool autostartWorks()
+{
+    Autostart autostart;
+    Autostart::Result result = Autostart::AlreadyAutostarted;
+    const QStringList entries = autostart.query(result);
+    // Where nobody answers, nothing starts; an application that there is not cannot be added anywhere.
+    return (result == Autostart::InternalError || result == Autostart::Success) && entries.isEmpty()
+        && autostart.add(QStringLiteral("no-such.desktop")) != Autostart::Success;
+}
+
 QString latestVersion()
 {
     const SoftwareUpdate update;
@@ -81,7 +92,7 @@ int main(int argc, char **argv)
 {
     QCoreApplication application(argc, argv);
     const bool works = simFilterWorks() && simVoiceCallFilterWorks() && otherFiltersWork() && simInfoWorks()
-        && callStatisticsWork();
+        && callStatisticsWork() && autostartWorks();
     QTextStream(stdout) << (works ? "consumer works" : "consumer fails") << ", update: " << latestVersion()
                         << '\n';
     return works ? 0 : 1;
