@@ -3,6 +3,9 @@
 #include <corvanemdm/autostart.h>
 #include <corvanemdm/callstatistics.h>
 #include <corvanemdm/corvanemdm_global.h>
+#include <corvanemdm/emailaccountprovisioner.h>
+#include <corvanemdm/genericaccountprovisioner.h>
+#include <corvanemdm/provisioner.h>
 #include <corvanemdm/simfilter.h>
 #include <corvanemdm/siminfo.h>
 #include <corvanemdm/simmobiledatafilter.h>
@@ -68,6 +71,18 @@ bool callStatisticsWork()
     return answers == 0;
 }
 
+bool provisionersWork()
+{
+    Accounts::EmailAccountProvisioner email;
+    email.setEmailAddress(QStringLiteral("a@example.org"));
+    Accounts::GenericAccountProvisioner generic;
+    generic.setUsername(QStringLiteral("a"));
+    Accounts::Provisioner &provisioner = generic;
+    // Where nobody answers, an account cannot be deleted either.
+    return !email.canCreateAccount() && !email.createAccount() && email.error() == 1
+        && !provisioner.deleteAccount(0) && provisioner.error() != 0 && !provisioner.errorMessage().isEmpty();
+}
+
 bool autostartWorks()
 {
     Autostart autostart;
@@ -92,7 +107,7 @@ int main(int argc, char **argv)
 {
     QCoreApplication application(argc, argv);
     const bool works = simFilterWorks() && simVoiceCallFilterWorks() && otherFiltersWork() && simInfoWorks()
-        && callStatisticsWork() && autostartWorks();
+        && callStatisticsWork() && autostartWorks() && provisionersWork();
     QTextStream(stdout) << (works ? "consumer works" : "consumer fails") << ", update: " << latestVersion()
                         << '\n';
     return works ? 0 : 1;
