@@ -136,6 +136,7 @@ QStringList Phone::takeJournal(const QString &service, bool withInterfaces)
         m_journalPosition = entry.number;
         if (entry.service != service || entry.interface.startsWith(QLatin1String("org.freedesktop.DBus")))
             continue;
+        m_lastSignature = entry.signature;
         const QString member
             = withInterfaces ? entry.interface + QLatin1Char('.') + entry.member : entry.member;
         calls.append(entry.path + QLatin1Char(' ') + member + QLatin1Char(' ') + entry.arguments);

@@ -70,7 +70,8 @@ SignalSequence::SignalSequence(QObject *object)
 {
     const QMetaObject *metaObject = object->metaObject();
     const int firstSlot = QObject::staticMetaObject.methodCount();
-    for (int index = metaObject->methodOffset(); index < metaObject->methodCount(); ++index) {
+    // From all classes but QObject.
+    for (int index = firstSlot; index < metaObject->methodCount(); ++index) {
         const QMetaMethod method = metaObject->method(index);
         if (method.methodType() != QMetaMethod::Signal)
             continue;
