@@ -5,6 +5,11 @@
 
 #include <corvanemdm/genericaccountprovisioner.h>
 
+#include <QtCore/QUuid>
+#include <QtDBus/QDBusObjectPath>
+#include <QtDBus/QDBusSignature>
+#include <QtDBus/QDBusUnixFileDescriptor>
+#include <QtDBus/QDBusVariant>
 #include <QtTest/QtTest>
 
 #include <memory>
@@ -41,7 +46,9 @@ private Q_SLOTS:
     void requiredSettings();
     void sendsSevenValues();
     void sendsAnEmptyMap();
+    void mapThatCannotTravel_data();
     void mapThatCannotTravel();
+    void oddMapsTravel();
     void makesAnAccount();
     void refusalTellsWhy();
     void errors();
@@ -136,18 +143,50 @@ void GenericAccountProvisionerTest::sendsAnEmptyMap()
                                           "'secret', '', @a{sv} {}, false)")));
 }
 
+void GenericAccountProvisionerTest::mapThatCannotTravel_data()
+{
+    QTest::addColumn<QVariant>("value");
+    const QString key = QStringLiteral("k");
+    QTest::newRow("nothing") << QVariant();
+    QTest::newRow("nothing in a list") << QVariant(QVariantList{1, QVariant()});
+    QTest::newRow("nothing in a map") << QVariant(QVariantMap{{key, QVariant()}});
+    QTest::newRow("nothing in a hash") << QVariant(QVariantHash{{key, QVariant()}});
+    QTest::newRow("nothing in a variant") << QVariant::fromValue(QDBusVariant(QVariant()));
+    QTest::newRow("not registered") << QVariant::fromValue(QUuid::createUuid());
+    QTest::newRow("no path") << QVariant::fromValue(QDBusObjectPath());
+    QTest::newRow("no signature") << QVariant::fromValue(QDBusSignature());
+    QTest::newRow("no file") << QVariant::fromValue(QDBusUnixFileDescriptor());
+}
+
 void GenericAccountProvisionerTest::mapThatCannotTravel()
+{
+    QFETCH(QVariant, value);
+    Generic generic;
+    complete(generic);
+    generic.setAccountConfiguration({{QStringLiteral("key"), value}});
+    QVERIFY(!generic.createAccount());
+    QCOMPARE(generic.error(), 1);
+    QCOMPARE(generic.errorMessage(),
+             QStringLiteral("The account configuration has a value that D-Bus cannot carry"));
+    m_phone->settle(Service);
+    QCOMPARE(m_phone->takeJournal(Service), QStringList());
+}
+
+void GenericAccountProvisionerTest::oddMapsTravel()
 {
     Generic generic;
     complete(generic);
-    generic.setAccountConfiguration({{QStringLiteral("none"), QVariant()}});
-    QVERIFY(!generic.createAccount());
-    QCOMPARE(generic.error(), 1);
-    QVERIFY(!generic.errorMessage().isEmpty());
-    m_phone->settle(Service);
-    QCOMPARE(m_phone->takeJournal(Service), QStringList());
-    // QtDBus's own words.
-    QVERIFY(!m_log->takeWarnings().join(QLatin1Char(' ')).contains(QLatin1String("secret")));
+    generic.setUsername(QStringLiteral("odd"));
+    generic.setAccountConfiguration(
+        {{QStringLiteral("a"), QVariant::fromValue(QDBusVariant(1u))},
+         {QStringLiteral("b"), QVariantList{QVariantHash{{QStringLiteral("x"), 0.5}}}},
+         {QString(), QVariant::fromValue(QDBusObjectPath(QStringLiteral("/p")))},
+         {QStringLiteral("c"), QByteArray("\0z", 2)}});
+    QVERIFY2(generic.createAccount(), qPrintable(generic.errorMessage()));
+    const QStringList calls = m_phone->takeJournal(Service);
+    QVERIFY2(calls.first().contains(QLatin1String("{'': <objectpath '/p'>, 'a': <<uint32 1>>, 'b': "
+                                                  "<[<{'x': <0.5>}>]>, 'c': <[byte 0x00, 0x7a]>}")),
+             qPrintable(calls.first()));
 }
 
 void GenericAccountProvisionerTest::makesAnAccount()
