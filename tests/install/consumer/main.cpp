@@ -5,6 +5,7 @@
 #include <corvanemdm/corvanemdm_global.h>
 #include <corvanemdm/emailaccountprovisioner.h>
 #include <corvanemdm/genericaccountprovisioner.h>
+#include <corvanemdm/notificationinfo.h>
 #include <corvanemdm/provisioner.h>
 #include <corvanemdm/simfilter.h>
 #include <corvanemdm/siminfo.h>
@@ -52,25 +53,6 @@ bool simVoiceCallFilterWorks()
     return !filter.ready() && filter.dialRules().isEmpty() && !filter.clearIncomingRules();
 }
 
-bool otherFiltersWork()
-{
-    SimSmsFilter texts;
-    QObject::connect(&texts, &SimSmsFilter::readyChanged, &texts, [] {});
-    SimMobileDataFilter data;
-    QObject::connect(&data, &SimMobileDataFilter::readyChanged, &data, [] {});
-    return !texts.ready() && !texts.clearTextRules() && !data.ready() && !data.clearRules();
-}
-
-bool callStatisticsWork()
-{
-    CallStatistics statistics;
-    int answers = 0;
-    QObject::connect(&statistics, &CallStatistics::searchFinished, &statistics,
-                     [&answers](bool, const QList<CallStatistics::Result> &) { ++answers; });
-    statistics.search(CallStatistics::Filter());
-    return answers == 0;
-}
-
 bool provisionersWork()
 {
     Accounts::EmailAccountProvisioner email;
@@ -93,6 +75,34 @@ bool autostartWorks()
         && autostart.add(QStringLiteral("no-such.desktop")) != Autostart::Success;
 }
 
+bool otherFiltersWork()
+{
+    SimSmsFilter texts;
+    QObject::connect(&texts, &SimSmsFilter::readyChanged, &texts, [] {});
+    SimMobileDataFilter data;
+    QObject::connect(&data, &SimMobileDataFilter::readyChanged, &data, [] {});
+    return !texts.ready() && !texts.clearTextRules() && !data.ready() && !data.clearRules();
+}
+
+bool callStatisticsWork()
+{
+    CallStatistics statistics;
+    int answers = 0;
+    QObject::connect(&statistics, &CallStatistics::searchFinished, &statistics,
+                     [&answers](bool, const QList<CallStatistics::Result> &) { ++answers; });
+    statistics.search(CallStatistics::Filter());
+    return answers == 0;
+}
+
+bool notificationInfoWorks()
+{
+    NotificationInfo info;
+    NotificationData data;
+    data.summary = QStringLiteral("Consumer");
+    const uint id = info.createNotification(data);
+    return id == 0 ? info.notifications().isEmpty() : info.closeNotification(id);
+}
+
 QString latestVersion()
 {
     const SoftwareUpdate update;
@@ -106,8 +116,8 @@ QString latestVersion()
 int main(int argc, char **argv)
 {
     QCoreApplication application(argc, argv);
-    const bool works = simFilterWorks() && simVoiceCallFilterWorks() && otherFiltersWork() && simInfoWorks()
-        && callStatisticsWork() && autostartWorks() && provisionersWork();
+    const bool works = provisionersWork() && autostartWorks() && simFilterWorks() && simVoiceCallFilterWorks()
+        && otherFiltersWork() && simInfoWorks() && callStatisticsWork() && notificationInfoWorks();
     QTextStream(stdout) << (works ? "consumer works" : "consumer fails") << ", update: " << latestVersion()
                         << '\n';
     return works ? 0 : 1;
