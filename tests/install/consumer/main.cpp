@@ -1,5 +1,6 @@
 // SPDX-License-Identifier: LGPL-2.1-or-later
 // Uses every public class from outside of the project. Where no service answers, it must work as well.
+#include <corvanemdm/applications.h>
 #include <corvanemdm/autostart.h>
 #include <corvanemdm/callstatistics.h>
 #include <corvanemdm/corvanemdm_global.h>
@@ -17,6 +18,9 @@
 #include <QtCore/QCoreApplication>
 #include <QtCore/QDebug>
 #include <QtCore/QTextStream>
+
+#include <algorithm>
+#include <initializer_list>
 
 using namespace Corvane::Mdm;
 
@@ -94,6 +98,18 @@ bool callStatisticsWork()
     return answers == 0;
 }
 
+bool applicationsWork()
+{
+    Applications applications;
+    // Nothing but the phone's own lists tells how many there are.
+    const QList<PackageEntry> packages = applications.getInstalledPackages();
+    const QList<ApplicationEntry> entries = applications.getInstalledApplications();
+    ApplicationOperation operation;
+    QObject::connect(&operation, &ApplicationOperation::finished, &operation, [](ApplicationOperation *) {});
+    return packages.size() >= 0 && entries.size() >= 0 && !PackageEntry().isValid()
+        && ApplicationEntry().name().isEmpty() && operation.isSucceeded();
+}
+
 bool notificationInfoWorks()
 {
     NotificationInfo info;
@@ -116,8 +132,12 @@ QString latestVersion()
 int main(int argc, char **argv)
 {
     QCoreApplication application(argc, argv);
-    const bool works = provisionersWork() && autostartWorks() && simFilterWorks() && simVoiceCallFilterWorks()
-        && otherFiltersWork() && simInfoWorks() && callStatisticsWork() && notificationInfoWorks();
+    const std::initializer_list<bool (*)()> checks{
+        simFilterWorks,   provisionersWork,        autostartWorks,
+        applicationsWork, simVoiceCallFilterWorks, otherFiltersWork,
+        simInfoWorks,     callStatisticsWork,      notificationInfoWorks,
+    };
+    const bool works = std::all_of(checks.begin(), checks.end(), [](bool (*check)()) { return check(); });
     QTextStream(stdout) << (works ? "consumer works" : "consumer fails") << ", update: " << latestVersion()
                         << '\n';
     return works ? 0 : 1;
