@@ -6,6 +6,7 @@
 #include <corvanemdm/corvanemdm_global.h>
 #include <corvanemdm/emailaccountprovisioner.h>
 #include <corvanemdm/genericaccountprovisioner.h>
+#include <corvanemdm/locationinfo.h>
 #include <corvanemdm/notificationinfo.h>
 #include <corvanemdm/provisioner.h>
 #include <corvanemdm/simfilter.h>
@@ -18,9 +19,6 @@
 #include <QtCore/QCoreApplication>
 #include <QtCore/QDebug>
 #include <QtCore/QTextStream>
-
-#include <algorithm>
-#include <initializer_list>
 
 using namespace Corvane::Mdm;
 
@@ -119,6 +117,15 @@ bool notificationInfoWorks()
     return id == 0 ? info.notifications().isEmpty() : info.closeNotification(id);
 }
 
+bool locationInfoWorks()
+{
+    LocationInfo info;
+    QObject::connect(&info, &LocationInfo::positionChanged, &info, [] {});
+    // Nothing is asked for before something was requested.
+    const LocationInfo::Position position = info.position();
+    return info.satellitesInUse() == -1 && !position.timestamp.isValid() && position.latitude == 0.0;
+}
+
 QString latestVersion()
 {
     const SoftwareUpdate update;
@@ -132,12 +139,16 @@ QString latestVersion()
 int main(int argc, char **argv)
 {
     QCoreApplication application(argc, argv);
-    const std::initializer_list<bool (*)()> checks{
-        simFilterWorks,   provisionersWork,        autostartWorks,
-        applicationsWork, simVoiceCallFilterWorks, otherFiltersWork,
-        simInfoWorks,     callStatisticsWork,      notificationInfoWorks,
-    };
-    const bool works = std::all_of(checks.begin(), checks.end(), [](bool (*check)()) { return check(); });
+    bool works = simFilterWorks();
+    works = provisionersWork() && works;
+    works = autostartWorks() && works;
+    works = applicationsWork() && works;
+    works = simVoiceCallFilterWorks() && works;
+    works = otherFiltersWork() && works;
+    works = simInfoWorks() && works;
+    works = callStatisticsWork() && works;
+    works = notificationInfoWorks() && works;
+    works = locationInfoWorks() && works;
     QTextStream(stdout) << (works ? "consumer works" : "consumer fails") << ", update: " << latestVersion()
                         << '\n';
     return works ? 0 : 1;
