@@ -3,6 +3,7 @@
 #include <corvanemdm/applications.h>
 #include <corvanemdm/autostart.h>
 #include <corvanemdm/callstatistics.h>
+#include <corvanemdm/certificates.h>
 #include <corvanemdm/corvanemdm_global.h>
 #include <corvanemdm/emailaccountprovisioner.h>
 #include <corvanemdm/genericaccountprovisioner.h>
@@ -69,6 +70,17 @@ bool provisionersWork()
         && !provisioner.deleteAccount(0) && provisioner.error() != 0 && !provisioner.errorMessage().isEmpty();
 }
 
+bool certificatesWork()
+{
+    const Certificates certificates;
+    QObject::connect(&certificates, &Certificates::installFinished, &certificates,
+                     [](const CertificateFile &, Certificates::Result) {});
+    const QList<CertificateFile> files = certificates.installedFiles() + certificates.blacklistedFiles();
+    return CertificateFile().isNull()
+        && std::none_of(files.begin(), files.end(),
+                        [](const CertificateFile &file) { return file.isNull(); });
+}
+
 bool autostartWorks()
 {
     Autostart autostart;
@@ -133,9 +145,8 @@ int main(int argc, char **argv)
 {
     QCoreApplication application(argc, argv);
     const std::initializer_list<bool (*)()> checks{
-        simFilterWorks,   provisionersWork,        autostartWorks,
-        applicationsWork, simVoiceCallFilterWorks, otherFiltersWork,
-        simInfoWorks,     callStatisticsWork,      notificationInfoWorks,
+        simFilterWorks,          provisionersWork, autostartWorks, certificatesWork,   applicationsWork,
+        simVoiceCallFilterWorks, otherFiltersWork, simInfoWorks,   callStatisticsWork, notificationInfoWorks,
     };
     const bool works = std::all_of(checks.begin(), checks.end(), [](bool (*check)()) { return check(); });
     QTextStream(stdout) << (works ? "consumer works" : "consumer fails") << ", update: " << latestVersion()
