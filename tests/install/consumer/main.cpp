@@ -3,6 +3,7 @@
 #include <corvanemdm/applications.h>
 #include <corvanemdm/autostart.h>
 #include <corvanemdm/callstatistics.h>
+#include <corvanemdm/certificates.h>
 #include <corvanemdm/corvanemdm_global.h>
 #include <corvanemdm/emailaccountprovisioner.h>
 #include <corvanemdm/genericaccountprovisioner.h>
@@ -65,6 +66,17 @@ bool provisionersWork()
     // Where nobody answers, an account cannot be deleted either.
     return !email.canCreateAccount() && !email.createAccount() && email.error() == 1
         && !provisioner.deleteAccount(0) && provisioner.error() != 0 && !provisioner.errorMessage().isEmpty();
+}
+
+bool certificatesWork()
+{
+    const Certificates certificates;
+    QObject::connect(&certificates, &Certificates::installFinished, &certificates,
+                     [](const CertificateFile &, Certificates::Result) {});
+    const QList<CertificateFile> files = certificates.installedFiles() + certificates.blacklistedFiles();
+    return CertificateFile().isNull()
+        && std::none_of(files.begin(), files.end(),
+                        [](const CertificateFile &file) { return file.isNull(); });
 }
 
 bool autostartWorks()
@@ -142,6 +154,7 @@ int main(int argc, char **argv)
     bool works = simFilterWorks();
     works = provisionersWork() && works;
     works = autostartWorks() && works;
+    works = certificatesWork() && works;
     works = applicationsWork() && works;
     works = simVoiceCallFilterWorks() && works;
     works = otherFiltersWork() && works;
