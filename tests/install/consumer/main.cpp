@@ -21,6 +21,8 @@
 #include <QtCore/QDebug>
 #include <QtCore/QTextStream>
 
+#include <algorithm>
+
 using namespace Corvane::Mdm;
 
 namespace
