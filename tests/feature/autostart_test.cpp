@@ -20,11 +20,6 @@ const QString Service = QStringLiteral("org.corvaneos.mdmproxy");
 const QString Path = QStringLiteral("/Corvane/Mdm/Proxy/Autostart");
 const QString Entry = QStringLiteral("/usr/share/applications/agent-of-test.desktop");
 
-QString journalLine(const char *text)
-{
-    return Path + QLatin1Char(' ') + QString::fromLatin1(text);
-}
-
 } // namespace
 
 class AutostartTest : public QObject
