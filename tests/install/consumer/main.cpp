@@ -4,6 +4,7 @@
 #include <corvanemdm/autostart.h>
 #include <corvanemdm/callstatistics.h>
 #include <corvanemdm/certificates.h>
+#include <corvanemdm/connectivitysettings.h>
 #include <corvanemdm/corvanemdm_global.h>
 #include <corvanemdm/emailaccountprovisioner.h>
 #include <corvanemdm/genericaccountprovisioner.h>
@@ -48,6 +49,17 @@ bool simInfoWorks()
     // Nothing is known before the event loop has run.
     return !info.available() && info.simSlotStates().isEmpty() && text.contains(QLatin1String("roaming"))
         && QString(slot) == QLatin1String("Slot(1) = (x)");
+}
+
+bool connectivitySettingsWork()
+{
+    ConnectivitySettings settings;
+    QObject::connect(&settings, &ConnectivitySettings::wlanEnabledChanged, &settings, [] {});
+    const ConnectivitySettings mirror(ConnectivitySettings::NetworkManagerMode);
+    ConnectivitySettings::MobileNetworkAccessPointSettings accessPoint;
+    const auto twoAndThree = ConnectivitySettings::Technology2G | ConnectivitySettings::Technology3G;
+    return settings.ready() && !mirror.wlanEnabled() && int(twoAndThree) == 3 && !accessPoint.isValid()
+        && !settings.setAccessPointSettings(QStringLiteral("244120000000001"), accessPoint);
 }
 
 bool simVoiceCallFilterWorks()
@@ -164,6 +176,7 @@ int main(int argc, char **argv)
     works = callStatisticsWork() && works;
     works = notificationInfoWorks() && works;
     works = locationInfoWorks() && works;
+    works = connectivitySettingsWork() && works;
     QTextStream(stdout) << (works ? "consumer works" : "consumer fails") << ", update: " << latestVersion()
                         << '\n';
     return works ? 0 : 1;
