@@ -4,6 +4,8 @@
 #include <corvanemdm/callstatistics.h>
 #include <corvanemdm/corvanemdm_global.h>
 #include <corvanemdm/locationinfo.h>
+#include <corvanemdm/netproxy.h>
+#include <corvanemdm/networkdatacounter.h>
 #include <corvanemdm/notificationinfo.h>
 #include <corvanemdm/simfilter.h>
 #include <corvanemdm/siminfo.h>
@@ -100,6 +102,25 @@ bool locationInfoWorks()
     return info.satellitesInUse() == -1 && !position.timestamp.isValid() && position.latitude == 0.0;
 }
 
+bool netProxyWorks()
+{
+    NetProxy proxy;
+    QObject::connect(&proxy, &NetProxy::validChanged, &proxy, [](bool) {});
+    // Nothing is selected before the event loop has run.
+    return !proxy.isValid() && proxy.type() == NetProxy::Invalid && !proxy.setType(NetProxy::Direct)
+        && proxy.getIdentifiers(QStringLiteral("global")) == QStringList(QStringLiteral("global"));
+}
+
+bool networkDataCounterWorks()
+{
+    NetworkDataCounter counter;
+    int updates = 0;
+    QObject::connect(&counter, &NetworkDataCounter::counterUpdate, &counter,
+                     [&updates](const NetworkDataCounter::Update &) { ++updates; });
+    counter.setUpdateInterval(5);
+    return !counter.active() && counter.updateInterval() == 5 && updates == 0;
+}
+
 QString latestVersion()
 {
     const SoftwareUpdate update;
@@ -114,7 +135,8 @@ int main(int argc, char **argv)
 {
     QCoreApplication application(argc, argv);
     const bool works = simFilterWorks() && simVoiceCallFilterWorks() && otherFiltersWork() && simInfoWorks()
-        && callStatisticsWork() && applicationsWork() && notificationInfoWorks() && locationInfoWorks();
+        && callStatisticsWork() && applicationsWork() && notificationInfoWorks() && locationInfoWorks()
+        && netProxyWorks() && networkDataCounterWorks();
     QTextStream(stdout) << (works ? "consumer works" : "consumer fails") << ", update: " << latestVersion()
                         << '\n';
     return works ? 0 : 1;
