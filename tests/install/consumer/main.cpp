@@ -9,6 +9,8 @@
 #include <corvanemdm/emailaccountprovisioner.h>
 #include <corvanemdm/genericaccountprovisioner.h>
 #include <corvanemdm/locationinfo.h>
+#include <corvanemdm/netproxy.h>
+#include <corvanemdm/networkdatacounter.h>
 #include <corvanemdm/notificationinfo.h>
 #include <corvanemdm/provisioner.h>
 #include <corvanemdm/simfilter.h>
@@ -152,6 +154,25 @@ bool locationInfoWorks()
     return info.satellitesInUse() == -1 && !position.timestamp.isValid() && position.latitude == 0.0;
 }
 
+bool netProxyWorks()
+{
+    NetProxy proxy;
+    QObject::connect(&proxy, &NetProxy::validChanged, &proxy, [](bool) {});
+    // Nothing is selected before the event loop has run.
+    return !proxy.isValid() && proxy.type() == NetProxy::Invalid && !proxy.setType(NetProxy::Direct)
+        && proxy.getIdentifiers(QStringLiteral("global")) == QStringList(QStringLiteral("global"));
+}
+
+bool networkDataCounterWorks()
+{
+    NetworkDataCounter counter;
+    int updates = 0;
+    QObject::connect(&counter, &NetworkDataCounter::counterUpdate, &counter,
+                     [&updates](const NetworkDataCounter::Update &) { ++updates; });
+    counter.setUpdateInterval(5);
+    return !counter.active() && counter.updateInterval() == 5 && updates == 0;
+}
+
 QString latestVersion()
 {
     const SoftwareUpdate update;
@@ -177,6 +198,8 @@ int main(int argc, char **argv)
     works = notificationInfoWorks() && works;
     works = locationInfoWorks() && works;
     works = connectivitySettingsWork() && works;
+    works = netProxyWorks() && works;
+    works = networkDataCounterWorks() && works;
     QTextStream(stdout) << (works ? "consumer works" : "consumer fails") << ", update: " << latestVersion()
                         << '\n';
     return works ? 0 : 1;
