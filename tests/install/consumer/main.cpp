@@ -4,6 +4,7 @@
 #include <corvanemdm/callstatistics.h>
 #include <corvanemdm/corvanemdm_global.h>
 #include <corvanemdm/locationinfo.h>
+#include <corvanemdm/locationsettings.h>
 #include <corvanemdm/notificationinfo.h>
 #include <corvanemdm/simfilter.h>
 #include <corvanemdm/siminfo.h>
@@ -100,6 +101,16 @@ bool locationInfoWorks()
     return info.satellitesInUse() == -1 && !position.timestamp.isValid() && position.latitude == 0.0;
 }
 
+bool locationSettingsWork()
+{
+    const LocationSettings settings;
+    QObject::connect(&settings, &LocationSettings::locationEnabledChanged, &settings, [] {});
+    const LocationSettings::DataSources satellites = LocationSettings::GpsData | LocationSettings::SbasData;
+    return satellites.testFlag(LocationSettings::GpsData)
+        && settings.availableAgpsProviders().contains(QStringLiteral("here"))
+        == settings.agpsAvailable(QStringLiteral("here"));
+}
+
 QString latestVersion()
 {
     const SoftwareUpdate update;
@@ -114,7 +125,8 @@ int main(int argc, char **argv)
 {
     QCoreApplication application(argc, argv);
     const bool works = simFilterWorks() && simVoiceCallFilterWorks() && otherFiltersWork() && simInfoWorks()
-        && callStatisticsWork() && applicationsWork() && notificationInfoWorks() && locationInfoWorks();
+        && callStatisticsWork() && applicationsWork() && notificationInfoWorks() && locationInfoWorks()
+        && locationSettingsWork();
     QTextStream(stdout) << (works ? "consumer works" : "consumer fails") << ", update: " << latestVersion()
                         << '\n';
     return works ? 0 : 1;
