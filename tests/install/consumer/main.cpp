@@ -2,6 +2,7 @@
 // Uses every public class from outside of the project. Where no service answers, it must work as well.
 #include <corvanemdm/applications.h>
 #include <corvanemdm/callstatistics.h>
+#include <corvanemdm/connectivitysettings.h>
 #include <corvanemdm/corvanemdm_global.h>
 #include <corvanemdm/locationinfo.h>
 #include <corvanemdm/locationsettings.h>
@@ -16,6 +17,9 @@
 #include <QtCore/QCoreApplication>
 #include <QtCore/QDebug>
 #include <QtCore/QTextStream>
+
+#include <algorithm>
+#include <iterator>
 
 using namespace Corvane::Mdm;
 
@@ -42,6 +46,17 @@ bool simInfoWorks()
     // Nothing is known before the event loop has run.
     return !info.available() && info.simSlotStates().isEmpty() && text.contains(QLatin1String("roaming"))
         && QString(slot) == QLatin1String("Slot(1) = (x)");
+}
+
+bool connectivitySettingsWork()
+{
+    ConnectivitySettings settings;
+    QObject::connect(&settings, &ConnectivitySettings::wlanEnabledChanged, &settings, [] {});
+    const ConnectivitySettings mirror(ConnectivitySettings::NetworkManagerMode);
+    ConnectivitySettings::MobileNetworkAccessPointSettings accessPoint;
+    const auto twoAndThree = ConnectivitySettings::Technology2G | ConnectivitySettings::Technology3G;
+    return settings.ready() && !mirror.wlanEnabled() && int(twoAndThree) == 3 && !accessPoint.isValid()
+        && !settings.setAccessPointSettings(QStringLiteral("244120000000001"), accessPoint);
 }
 
 bool simVoiceCallFilterWorks()
@@ -124,9 +139,20 @@ QString latestVersion()
 int main(int argc, char **argv)
 {
     QCoreApplication application(argc, argv);
-    const bool works = simFilterWorks() && simVoiceCallFilterWorks() && otherFiltersWork() && simInfoWorks()
-        && callStatisticsWork() && applicationsWork() && notificationInfoWorks() && locationInfoWorks()
-        && locationSettingsWork();
+    bool (*const checks[])() = {
+        simFilterWorks,
+        simInfoWorks,
+        connectivitySettingsWork,
+        simVoiceCallFilterWorks,
+        otherFiltersWork,
+        callStatisticsWork,
+        applicationsWork,
+        notificationInfoWorks,
+        locationInfoWorks,
+        locationSettingsWork,
+    };
+    const bool works
+        = std::all_of(std::begin(checks), std::end(checks), [](bool (*check)()) { return check(); });
     QTextStream(stdout) << (works ? "consumer works" : "consumer fails") << ", update: " << latestVersion()
                         << '\n';
     return works ? 0 : 1;
