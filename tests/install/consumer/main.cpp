@@ -1,9 +1,11 @@
 // SPDX-License-Identifier: LGPL-2.1-or-later
 // Uses every public class from outside of the project. Where no service answers, it must work as well.
 #include <corvanemdm/applications.h>
+#include <corvanemdm/batteryinfo.h>
 #include <corvanemdm/callstatistics.h>
 #include <corvanemdm/connectivitysettings.h>
 #include <corvanemdm/corvanemdm_global.h>
+#include <corvanemdm/datetimesettings.h>
 #include <corvanemdm/locationinfo.h>
 #include <corvanemdm/locationsettings.h>
 #include <corvanemdm/notificationinfo.h>
@@ -126,6 +128,22 @@ bool locationSettingsWork()
         == settings.agpsAvailable(QStringLiteral("here"));
 }
 
+bool dateTimeSettingsWork()
+{
+    DateTimeSettings settings;
+    QObject::connect(&settings, &DateTimeSettings::timeZoneChanged, &settings, [] {});
+    // Nothing is known before the event loop has run.
+    return !settings.ready() && settings.timeZone().isEmpty()
+        && settings.supportedTimeZones().contains(QStringLiteral("Europe/Helsinki"));
+}
+
+bool batteryInfoWorks()
+{
+    const BatteryInfo battery;
+    QObject::connect(&battery, &BatteryInfo::chargePercentageChanged, &battery, [](int) {});
+    return battery.chargePercentage() == -1 && battery.status() == BatteryInfo::BatteryStatusUnknown;
+}
+
 QString latestVersion()
 {
     const SoftwareUpdate update;
@@ -140,16 +158,9 @@ int main(int argc, char **argv)
 {
     QCoreApplication application(argc, argv);
     bool (*const checks[])() = {
-        simFilterWorks,
-        simInfoWorks,
-        connectivitySettingsWork,
-        simVoiceCallFilterWorks,
-        otherFiltersWork,
-        callStatisticsWork,
-        applicationsWork,
-        notificationInfoWorks,
-        locationInfoWorks,
-        locationSettingsWork,
+        simFilterWorks,    simInfoWorks,         connectivitySettingsWork, simVoiceCallFilterWorks,
+        otherFiltersWork,  callStatisticsWork,   applicationsWork,         notificationInfoWorks,
+        locationInfoWorks, locationSettingsWork, dateTimeSettingsWork,     batteryInfoWorks,
     };
     const bool works
         = std::all_of(std::begin(checks), std::end(checks), [](bool (*check)()) { return check(); });
