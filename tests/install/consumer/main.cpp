@@ -3,6 +3,7 @@
 #include <corvanemdm/applications.h>
 #include <corvanemdm/callstatistics.h>
 #include <corvanemdm/corvanemdm_global.h>
+#include <corvanemdm/locationinfo.h>
 #include <corvanemdm/notificationinfo.h>
 #include <corvanemdm/simfilter.h>
 #include <corvanemdm/siminfo.h>
@@ -90,6 +91,15 @@ bool notificationInfoWorks()
     return id == 0 ? info.notifications().isEmpty() : info.closeNotification(id);
 }
 
+bool locationInfoWorks()
+{
+    LocationInfo info;
+    QObject::connect(&info, &LocationInfo::positionChanged, &info, [] {});
+    // Nothing is asked for before something was requested.
+    const LocationInfo::Position position = info.position();
+    return info.satellitesInUse() == -1 && !position.timestamp.isValid() && position.latitude == 0.0;
+}
+
 QString latestVersion()
 {
     const SoftwareUpdate update;
@@ -104,7 +114,7 @@ int main(int argc, char **argv)
 {
     QCoreApplication application(argc, argv);
     const bool works = simFilterWorks() && simVoiceCallFilterWorks() && otherFiltersWork() && simInfoWorks()
-        && callStatisticsWork() && applicationsWork() && notificationInfoWorks();
+        && callStatisticsWork() && applicationsWork() && notificationInfoWorks() && locationInfoWorks();
     QTextStream(stdout) << (works ? "consumer works" : "consumer fails") << ", update: " << latestVersion()
                         << '\n';
     return works ? 0 : 1;
