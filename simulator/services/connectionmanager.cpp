@@ -80,6 +80,7 @@ class ConnectionManager : public Component
 {
 public:
     ConnectionManager(const QJsonObject &profile, Phone &phone);
+    ~ConnectionManager() override { m_links.watch(nullptr); }
 
     void attach(Service &service) override;
     void detach() override;

@@ -61,6 +61,7 @@ class Modems : public Component
 {
 public:
     Modems(const QJsonObject &profile, Phone &phone);
+    ~Modems() override;
 
     void attach(Service &service) override;
     void detach() override;
@@ -114,6 +115,12 @@ Modems::Modems(const QJsonObject &profile, Phone &phone)
     });
     for (const std::unique_ptr<Modem> &modem : m_modems)
         modem->setExtended(m_manager.isOffered());
+}
+
+Modems::~Modems()
+{
+    m_phone.cellularLinks.setActivator(nullptr);
+    m_phone.cellularLinks.watchFlightMode(nullptr);
 }
 
 void Modems::attach(Service &service)

@@ -258,7 +258,7 @@ void ConnectivitySettingsTest::cleanup()
     m_log.reset();
     m_phone->clearFaults();
     m_phone->startService(Ofono);
-    // TEMP m_phone->startService(Connman);
+    m_phone->startService(Connman);
     QCOMPARE(warnings, QStringList());
 }
 

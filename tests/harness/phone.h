@@ -24,8 +24,8 @@ public:
     void failCalls(const QString &service, const QString &path, const QString &member, const QString &error,
                    const QString &message);
     /**
-     * Only the call with @p number, from 1, fails of those of @p member. Of faults for the same calls, the one
-     * that was set last comes first, and the others once it is used up.
+     * Only the call with @p number, from 1, fails of those of @p member. Of faults for the same calls,
+     * the one that was set last comes first, and the others once it is used up.
      */
     void failCall(int number, const QString &service, const QString &path, const QString &member,
                   const QString &error, const QString &message);
