@@ -22,6 +22,7 @@ Command program()
     mdmctl.description = QStringLiteral("Examples:\n"
                                         "  mdmctl update status\n"
                                         "  mdmctl calls add dial 244051234567890 block\n"
+                                        "  mdmctl flight-mode on\n"
                                         "  mdmctl policy check company-phone.json\n"
                                         "\n"
                                         "Results go to standard output, as tables or, with --json, as JSON; "
