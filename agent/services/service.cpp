@@ -64,5 +64,10 @@ Reply Service::notRunning() const
     return {Reply::ServiceLost, toString() + QLatin1String(" is not running")};
 }
 
+QString Service::refusal(const QString &reason) const
+{
+    return QStringLiteral("%1 refused: %2").arg(toString(), reason);
+}
+
 } // namespace Agent
 } // namespace Corvane

@@ -35,6 +35,9 @@ struct Service {
 
     /** The answer to everything that is asked of a service that is not there. */
     Reply notRunning() const;
+
+    /** "the telephony service (org.ofono) refused: @p reason" */
+    QString refusal(const QString &reason) const;
 };
 
 } // namespace Agent
