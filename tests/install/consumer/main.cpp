@@ -1,7 +1,9 @@
 // SPDX-License-Identifier: LGPL-2.1-or-later
 // Uses every public class from outside of the project. Where no service answers, it must work as well.
+#include <corvanemdm/applications.h>
 #include <corvanemdm/callstatistics.h>
 #include <corvanemdm/corvanemdm_global.h>
+#include <corvanemdm/locationinfo.h>
 #include <corvanemdm/notificationinfo.h>
 #include <corvanemdm/simfilter.h>
 #include <corvanemdm/siminfo.h>
@@ -68,6 +70,18 @@ bool callStatisticsWork()
     return answers == 0;
 }
 
+bool applicationsWork()
+{
+    Applications applications;
+    // Nothing but the phone's own lists tells how many there are.
+    const QList<PackageEntry> packages = applications.getInstalledPackages();
+    const QList<ApplicationEntry> entries = applications.getInstalledApplications();
+    ApplicationOperation operation;
+    QObject::connect(&operation, &ApplicationOperation::finished, &operation, [](ApplicationOperation *) {});
+    return packages.size() >= 0 && entries.size() >= 0 && !PackageEntry().isValid()
+        && ApplicationEntry().name().isEmpty() && operation.isSucceeded();
+}
+
 bool notificationInfoWorks()
 {
     NotificationInfo info;
@@ -75,6 +89,15 @@ bool notificationInfoWorks()
     data.summary = QStringLiteral("Consumer");
     const uint id = info.createNotification(data);
     return id == 0 ? info.notifications().isEmpty() : info.closeNotification(id);
+}
+
+bool locationInfoWorks()
+{
+    LocationInfo info;
+    QObject::connect(&info, &LocationInfo::positionChanged, &info, [] {});
+    // Nothing is asked for before something was requested.
+    const LocationInfo::Position position = info.position();
+    return info.satellitesInUse() == -1 && !position.timestamp.isValid() && position.latitude == 0.0;
 }
 
 QString latestVersion()
@@ -91,7 +114,7 @@ int main(int argc, char **argv)
 {
     QCoreApplication application(argc, argv);
     const bool works = simFilterWorks() && simVoiceCallFilterWorks() && otherFiltersWork() && simInfoWorks()
-        && callStatisticsWork() && notificationInfoWorks();
+        && callStatisticsWork() && applicationsWork() && notificationInfoWorks() && locationInfoWorks();
     QTextStream(stdout) << (works ? "consumer works" : "consumer fails") << ", update: " << latestVersion()
                         << '\n';
     return works ? 0 : 1;
