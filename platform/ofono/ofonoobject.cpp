@@ -1,5 +1,6 @@
 // SPDX-License-Identifier: LGPL-2.1-or-later
 #include "ofonoobject_p.h"
+#include "signalconnection_p.h"
 
 #include <QtCore/QPointer>
 #include <QtDBus/QDBusConnection>
@@ -96,18 +97,20 @@ void OfonoObject::ownerChanged()
 
 void OfonoObject::connectSignals()
 {
-    QDBusConnection bus = QDBusConnection::systemBus();
+    const QDBusConnection bus = QDBusConnection::systemBus();
     for (const Connection &each : qAsConst(m_connections))
-        bus.connect(m_owner, m_path, m_interface, QLatin1String(each.member), each.receiver, each.slot);
+        connectDBusSignal(bus, {m_owner, m_path, m_interface, QLatin1String(each.member)}, each.receiver,
+                          each.slot);
 }
 
 void OfonoObject::disconnectSignals()
 {
     if (m_owner.isEmpty())
         return;
-    QDBusConnection bus = QDBusConnection::systemBus();
+    const QDBusConnection bus = QDBusConnection::systemBus();
     for (const Connection &each : qAsConst(m_connections))
-        bus.disconnect(m_owner, m_path, m_interface, QLatin1String(each.member), each.receiver, each.slot);
+        disconnectDBusSignal(bus, {m_owner, m_path, m_interface, QLatin1String(each.member)}, each.receiver,
+                             each.slot);
 }
 
 QDBusPendingCall OfonoObject::send(QLatin1String method) const

@@ -87,6 +87,7 @@ int main(int argc, char *argv[])
     settings.lives = numberOf(parser, lives);
     settings.patience = int(numberOf(parser, patience));
     settings.verbose = parser.isSet(verbose);
+    settings.hasAllClasses = !parser.isSet(oneClass);
     settings.classes = parser.isSet(oneClass) ? parser.values(oneClass) : classNames();
     for (const QString &name : qAsConst(settings.classes)) {
         if (!classNames().contains(name)) {

@@ -205,7 +205,7 @@ QByteArray Stranger::describeLast() const
 QByteArray Stranger::replayCommand() const
 {
     QByteArray classes;
-    for (const QString &name : m_settings.classes)
+    for (const QString &name : m_settings.hasAllClasses ? QStringList() : m_settings.classes)
         classes += " --class " + name.toUtf8();
     const QByteArray life = QByteArray::number(m_life);
     return "This life alone: --seed " + QByteArray::number(m_settings.seed) + classes + " --from " + life

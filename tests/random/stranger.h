@@ -20,6 +20,7 @@ struct RunSettings {
     quint64 from = 0; ///< the first life
     quint64 lives = 0; ///< how many; 0 for as many as the messages take
     QStringList classes; ///< that take turns
+    bool hasAllClasses = true;
     bool verbose = false;
     int patience = 60; ///< seconds without a sign of life that are taken for a hang
 };
