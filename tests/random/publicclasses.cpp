@@ -2,7 +2,9 @@
 // Every public class of the library with all that it can be asked to do; properties are found by themselves.
 #include "testedclass.h"
 
+#include <corvanemdm/applications.h>
 #include <corvanemdm/callstatistics.h>
+#include <corvanemdm/locationinfo.h>
 #include <corvanemdm/notificationinfo.h>
 #include <corvanemdm/simfilter.h>
 #include <corvanemdm/siminfo.h>
@@ -112,6 +114,31 @@ TestedClass softwareUpdate()
                                 CALL(installSoftwareUpdate)});
 }
 
+TestedClass locationInfo()
+{
+    using Tested = LocationInfo;
+    return testedClass<Tested>(
+        "LocationInfo",
+        {CALL(latitude), CALL(position), CALL(startUpdates), CALL(stopUpdates), CALL(requestUpdate)});
+}
+
+TestedClass applications()
+{
+    using Tested = Applications;
+    return testedClass<Tested>("Applications",
+                               {CALL(getInstalledPackages), CALL(getInstalledApplications),
+                                CALL(installPackage), CALL(removePackage)});
+}
+
+TestedClass applicationOperation()
+{
+    using Tested = ApplicationOperation;
+    return testedClass<Tested>("ApplicationOperation",
+                               {CALL(package), CALL(version), CALL(errorString), CALL(isFinished),
+                                CALL(isSucceeded), CALL(setError), CALL(setFinished),
+                                CALL(setFinishedWithError)});
+}
+
 } // namespace
 
 const std::vector<TestedClass> &testedClasses()
@@ -125,6 +152,9 @@ const std::vector<TestedClass> &testedClasses()
         callStatistics(),
         notificationInfo(),
         softwareUpdate(),
+        locationInfo(),
+        applications(),
+        applicationOperation(),
     };
     return classes;
 }
