@@ -2,6 +2,8 @@
 #ifndef CORVANE_SIMULATOR_PHONE_H
 #define CORVANE_SIMULATOR_PHONE_H
 
+#include "cellularlinks.h"
+
 #include <QtCore/QJsonObject>
 #include <QtCore/QString>
 #include <QtCore/QStringList>
@@ -42,6 +44,7 @@ public:
     std::optional<std::size_t> slotNumbered(const QString &text) const;
 
     std::vector<Sim> sims; ///< by slot
+    CellularLinks cellularLinks;
 
 private:
     std::map<QString, Sim> m_cards; ///< of the profile, by IMSI

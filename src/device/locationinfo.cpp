@@ -4,7 +4,7 @@
 #include "frame/blockingquery_p.h"
 #include "frame/mdmproxy_p.h"
 #include "locationinfo_p.h"
-#include "platform/signalconnection_p.h"
+#include "platform/frame/signalconnection_p.h"
 
 #include <QtDBus/QDBusConnection>
 

@@ -4,7 +4,7 @@
 #include "callstatistics_p.h"
 #include "frame/asynccommand_p.h"
 #include "frame/mdmproxy_p.h"
-#include "platform/signalconnection_p.h"
+#include "platform/frame/signalconnection_p.h"
 
 #include <QtCore/QDebug>
 #include <QtDBus/QDBusConnection>

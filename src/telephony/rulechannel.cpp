@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: LGPL-2.1-or-later
-#include "platform/signalconnection_p.h"
+#include "platform/frame/signalconnection_p.h"
 #include "rulechannel_p.h"
 
 #include <QtCore/QPointer>

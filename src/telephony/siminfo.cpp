@@ -2,7 +2,7 @@
 #include <corvanemdm/siminfo.h>
 
 #include "frame/asynccommand_p.h"
-#include "platform/signalconnection_p.h"
+#include "platform/frame/signalconnection_p.h"
 #include "siminfo_p.h"
 
 #include <mlite/mgconfitem.h>

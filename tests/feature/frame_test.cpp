@@ -3,7 +3,7 @@
 #include "frame/blockingquery_p.h"
 #include "frame/mdmproxy_p.h"
 #include "frame/objectpathproperties_p.h"
-#include "platform/signalconnection_p.h"
+#include "platform/frame/signalconnection_p.h"
 
 #include "messagelog.h"
 #include "phone.h"

@@ -1,9 +1,10 @@
 // SPDX-License-Identifier: LGPL-2.1-or-later
-// Every public class of the library with all that it can be asked to do; properties are found by themselves.
+// Every public class of the library with all that it can be asked to do, but for what its properties do.
 #include "testedclass.h"
 
 #include <corvanemdm/applications.h>
 #include <corvanemdm/callstatistics.h>
+#include <corvanemdm/connectivitysettings.h>
 #include <corvanemdm/locationinfo.h>
 #include <corvanemdm/notificationinfo.h>
 #include <corvanemdm/simfilter.h>
@@ -48,6 +49,23 @@ template <> struct RandomArgument<NotificationData> {
         data.timestamp = randomArgument<QDateTime>(source);
         data.remoteActions = randomArgument<QVariantList>(source);
         return data;
+    }
+};
+
+using AccessPoint = ConnectivitySettings::MobileNetworkAccessPointSettings;
+
+template <> struct RandomArgument<AccessPoint> {
+    static AccessPoint make(ArgumentSource &source)
+    {
+        AccessPoint settings;
+        settings.type = randomArgument<AccessPoint::Type>(source);
+        settings.protocol = randomArgument<AccessPoint::Protocol>(source);
+        settings.authenticationMethod = randomArgument<AccessPoint::AuthenticationMethod>(source);
+        for (QString *text : {&settings.name, &settings.accessPointName, &settings.username,
+                              &settings.password, &settings.messageCenter, &settings.messageProxy}) {
+            *text = randomArgument<QString>(source);
+        }
+        return settings;
     }
 };
 
@@ -139,6 +157,21 @@ TestedClass applicationOperation()
                                 CALL(setFinishedWithError)});
 }
 
+TestedClass connectivitySettings()
+{
+    using Tested = ConnectivitySettings;
+    TestedClass tested = testedClass<Tested>(
+        "ConnectivitySettings",
+        {CALL(setWlanEnabled), CALL(setFlightModeEnabled), CALL(modemPaths), CALL(modemSimImsi),
+         CALL(mobileNetworkImsis), CALL(supportedCellularTechnologies), CALL(selectedCellularTechnologies),
+         CALL(selectCellularTechnologies), CALL(isConnectedToMobileNetwork), CALL(connectToMobileNetwork),
+         CALL(disconnectFromMobileNetwork), CALL(accessPointSettings), CALL(setAccessPointSettings)});
+    tested.create = [](QObject *parent, ArgumentSource &source) -> QObject * {
+        return new Tested(randomArgument<Tested::Mode>(source), parent);
+    };
+    return tested;
+}
+
 } // namespace
 
 const std::vector<TestedClass> &testedClasses()
@@ -153,6 +186,7 @@ const std::vector<TestedClass> &testedClasses()
         notificationInfo(),
         softwareUpdate(),
         locationInfo(),
+        connectivitySettings(),
         applications(),
         applicationOperation(),
     };

@@ -56,6 +56,33 @@ void letHappen(uint count)
     QCoreApplication::sendPostedEvents(nullptr, QEvent::DeferredDelete);
 }
 
+/** Most of them of the type that the property has. */
+QVariant valueFor(const QMetaProperty &property, ArgumentSource &source)
+{
+    if (source.random.chance(20))
+        return randomArgument<QVariant>(source);
+    if (property.isEnumType())
+        return randomArgument<int>(source);
+    switch (property.userType()) {
+    case QMetaType::Bool:
+        return randomArgument<bool>(source);
+    case QMetaType::Int:
+        return randomArgument<int>(source);
+    case QMetaType::QString:
+        return randomArgument<QString>(source);
+    case QMetaType::QStringList:
+        return randomArgument<QStringList>(source);
+    case QMetaType::QUrl:
+        return randomArgument<QUrl>(source);
+    case QMetaType::QVariantMap:
+        return randomArgument<QVariantMap>(source);
+    default:
+        if (property.userType() == qMetaTypeId<QList<QUrl>>())
+            return QVariant::fromValue(randomArgument<QList<QUrl>>(source));
+        return randomArgument<QVariant>(source);
+    }
+}
+
 /** One life: objects are made, used and destroyed while messages come. */
 class Life
 {
@@ -157,7 +184,7 @@ void Life::Member::writeProperty()
     const QMetaProperty property = metaObject->property(m_random.below(metaObject->propertyCount()));
     log("write", property.name());
     ++m_underWay;
-    property.write(m_object, randomArgument<QVariant>(m_arguments));
+    property.write(m_object, valueFor(property, m_arguments));
     --m_underWay;
 }
 
@@ -194,7 +221,7 @@ void Life::step()
         return;
     }
     const auto index = std::size_t(m_random.below(int(m_members.size())));
-    if (choice < 9)
+    if (choice < 8)
         m_members[index]->performSomething();
     else if (choice < 10)
         m_members[index]->writeProperty();

@@ -1,6 +1,6 @@
 // SPDX-License-Identifier: LGPL-2.1-or-later
-#ifndef CORVANEMDM_PLATFORM_SIGNALCONNECTION_P_H
-#define CORVANEMDM_PLATFORM_SIGNALCONNECTION_P_H
+#ifndef CORVANEMDM_PLATFORM_FRAME_SIGNALCONNECTION_P_H
+#define CORVANEMDM_PLATFORM_FRAME_SIGNALCONNECTION_P_H
 
 #include <QtCore/QMetaMethod>
 #include <QtCore/QObject>
@@ -52,4 +52,4 @@ inline bool disconnectDBusSignal(QDBusConnection bus, const DBusSignal &signal, 
                           signatureOfSlot(receiver, slot), receiver, slot);
 }
 
-#endif // CORVANEMDM_PLATFORM_SIGNALCONNECTION_P_H
+#endif // CORVANEMDM_PLATFORM_FRAME_SIGNALCONNECTION_P_H
