@@ -34,6 +34,10 @@ constexpr Comparison Comparisons[] = {
      "list/demarshal+copy/100000", 2},
     {"whole list, 100,000 rules / 10,000 rules", "list/library/100000", "list/library/10000", 12},
     {"one rule added to 10,000 / one copy of the list", "rule/library/10000", "rule/copy/10000", 4},
+    {"10,000 packages / rpm -qa with the same fields", "packages/library", "packages/rpm", 1},
+    {"10,000 packages / the loop over librpm alone", "packages/library", "packages/librpm", 0},
+    {"500 applications / rpm -qf of their files in one process", "applications/library", "applications/rpm",
+     1},
     {"loading the library / loading its dependencies", "load/library", "load/dependencies", 0},
 };
 
