@@ -246,7 +246,9 @@ PackageStore::Change PackageStore::removal(const QStringList &ids, bool allowDep
 
 void PackageStore::make(const Change &change, std::function<void(const QString &)> done)
 {
+    m_busy = true;
     const auto finish = [this, change, done](const QString &problem) {
+        m_busy = false;
         if (problem.isEmpty())
             apply(change);
         done(problem);
