@@ -27,7 +27,9 @@ void loadLibrary(benchmark::State &state)
 
 void loadDependencies(benchmark::State &state)
 {
-    loadLibraries(state, {QStringLiteral("libQt5DBus.so.5"), QStringLiteral(PLATFORM_LIBRARY_FILE)});
+    loadLibraries(state,
+                  {QStringLiteral("libQt5DBus.so.5"), QStringLiteral("libpackagekitqt5.so.1"),
+                   QStringLiteral("librpm.so.9"), QStringLiteral(PLATFORM_LIBRARY_FILE)});
 }
 
 } // namespace

@@ -30,6 +30,8 @@ Sim Phone::cardWithImsi(const QString &imsi) const
 }
 
 Phone::Phone(const QJsonObject &profile)
+    : installedPackages(
+        profile.value(QLatin1String("packages")).toObject().value(QLatin1String("installed")).toArray())
 {
     const QJsonArray slots = profile.value(QLatin1String("sims")).toArray();
     for (const QJsonValue &slot : slots) {

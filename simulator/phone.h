@@ -4,6 +4,7 @@
 
 #include "cellularlinks.h"
 
+#include <QtCore/QJsonArray>
 #include <QtCore/QJsonObject>
 #include <QtCore/QString>
 #include <QtCore/QStringList>
@@ -44,6 +45,7 @@ public:
     std::optional<std::size_t> slotNumbered(const QString &text) const;
 
     std::vector<Sim> sims; ///< by slot
+    QJsonArray installedPackages; ///< when the phone was new, in the profile's words
     CellularLinks cellularLinks;
 
 private:

@@ -3,6 +3,7 @@
 
 #include "atmodem/emulatedmodems.h"
 #include "networkcables.h"
+#include "packageauthority.h"
 
 namespace Corvane
 {
@@ -51,6 +52,22 @@ RealDaemon connman()
     };
 }
 
+RealDaemon packageKit()
+{
+    return {
+        QStringLiteral("packagekit"),
+        {QStringLiteral("org.freedesktop.PackageKit")},
+        // The backend without sources of its own, and no end after some minutes without work.
+        {"/usr/libexec/packagekitd", "--backend=dummy", "--disable-timer"},
+        "packagekit",
+        {"/var/lib/PackageKit", "/var/cache/PackageKit"},
+        {},
+        [](Phone &phone) -> std::unique_ptr<DaemonHardware> {
+            return std::make_unique<PackageAuthority>(phone);
+        },
+    };
+}
+
 } // namespace
 
 std::string RealDaemon::logFile() const
@@ -60,8 +77,8 @@ std::string RealDaemon::logFile() const
 
 const std::vector<RealDaemon> &realDaemons()
 {
-    static const std::vector<RealDaemon> daemons{ofonoWithOurPlugin(),
-                                                 stockOfono(QStringLiteral("stock-ofono")), connman()};
+    static const std::vector<RealDaemon> daemons{
+        ofonoWithOurPlugin(), stockOfono(QStringLiteral("stock-ofono")), connman(), packageKit()};
     return daemons;
 }
 

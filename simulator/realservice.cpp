@@ -150,7 +150,9 @@ void RealService::advance()
         m_hardware->bringUp([this] { finish(QString()); });
     } else if (m_phase == Stopping && !m_process && std::none_of(names.begin(), names.end(), isOnBus)) {
         // A daemon that does not end well when it is asked to is broken, perhaps by our own addition to it.
-        finish(m_status == 0 ? QString() : obituary());
+        // Some leave the end to the signal.
+        const bool endedWell = m_status == 0 || (WIFSIGNALED(m_status) && WTERMSIG(m_status) == SIGTERM);
+        finish(endedWell ? QString() : obituary());
     }
 }
 

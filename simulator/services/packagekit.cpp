@@ -311,8 +311,10 @@ void PackageKit::makeProgress(const TransactionPointer &transaction, const Packa
     const std::weak_ptr<PackageTransaction> weak(transaction);
     m_store.make(change, [this, weak](const QString &problem) {
         const TransactionPointer made = weak.lock();
-        if (!made)
+        if (!made) {
+            runNext();
             return;
+        }
         if (problem.isEmpty())
             finish(made, PackageTransaction::Success);
         else
@@ -330,7 +332,7 @@ void PackageKit::queue(const TransactionPointer &transaction, std::function<void
 
 void PackageKit::runNext()
 {
-    if (m_running || m_queue.empty())
+    if (m_running || m_queue.empty() || m_store.isBusy())
         return;
     const Waiting next = m_queue.front();
     m_queue.pop_front();

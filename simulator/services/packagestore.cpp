@@ -1,7 +1,7 @@
 // SPDX-License-Identifier: LGPL-2.1-or-later
 #include "packagestore.h"
 
-#include "glibpointers.h"
+#include "databaseprogram.h"
 
 #include <QtCore/QDir>
 #include <QtCore/QFile>
@@ -18,9 +18,6 @@ namespace Simulator
 
 namespace
 {
-
-const QLatin1String databaseFile("/var/lib/rpm/rpmdb.sqlite");
-constexpr char databaseProgram[] = "corvane-package-database";
 
 // PackageKit's filters.
 constexpr quint64 installedFilter = 1 << 2;
@@ -67,67 +64,6 @@ void removeFiles(const Package &package)
         QFile::remove(path);
 }
 
-GObjectPointer<GSubprocess> startDatabaseProgram(const std::vector<QByteArray> &arguments, QString &problem)
-{
-    std::vector<const gchar *> command{databaseProgram};
-    for (const QByteArray &argument : arguments)
-        command.push_back(argument.constData());
-    command.push_back(nullptr);
-    ErrorSlot error;
-    GObjectPointer<GSubprocess> process(g_subprocess_newv(
-        command.data(), GSubprocessFlags(G_SUBPROCESS_FLAGS_STDIN_PIPE | G_SUBPROCESS_FLAGS_STDERR_PIPE),
-        &error));
-    if (!process)
-        problem = QString::fromUtf8(error->message);
-    return process;
-}
-
-QString outcomeOf(GSubprocess *process, const gchar *output, const ErrorSlot &error)
-{
-    if (error)
-        return QString::fromUtf8(error->message);
-    return g_subprocess_get_successful(process) ? QString() : QString::fromUtf8(output).trimmed();
-}
-
-using Done = std::function<void(const QString &problem)>;
-
-/** Runs the program that writes the database, and calls @p done when it has ended. */
-void runDatabaseProgram(const std::vector<QByteArray> &arguments, const QByteArray &input, Done done)
-{
-    QString problem;
-    const GObjectPointer<GSubprocess> process = startDatabaseProgram(arguments, problem);
-    if (!process) {
-        done(problem);
-        return;
-    }
-    g_subprocess_communicate_utf8_async(
-        process.get(), input.constData(), nullptr,
-        [](GObject *source, GAsyncResult *result, gpointer data) {
-            const std::unique_ptr<Done> finished(static_cast<Done *>(data));
-            gchar *output = nullptr;
-            ErrorSlot error;
-            g_subprocess_communicate_utf8_finish(G_SUBPROCESS(source), result, nullptr, &output, &error);
-            const GCharPointer words(output);
-            (*finished)(outcomeOf(G_SUBPROCESS(source), words.get(), error));
-        },
-        new Done(std::move(done)));
-}
-
-/** The same, for the start of the phone: nothing else is going on. */
-void fillDatabase(const QByteArray &input)
-{
-    QString problem;
-    const GObjectPointer<GSubprocess> process = startDatabaseProgram({"add"}, problem);
-    if (process) {
-        gchar *output = nullptr;
-        ErrorSlot error;
-        g_subprocess_communicate_utf8(process.get(), input.constData(), nullptr, nullptr, &output, &error);
-        problem = outcomeOf(process.get(), GCharPointer(output).get(), error);
-    }
-    if (!problem.isEmpty())
-        qWarning("the phone has no package database: %s", qUtf8Printable(problem));
-}
-
 QString nameOf(const QString &id)
 {
     return id.section(QLatin1Char(';'), 0, 0);
@@ -147,8 +83,7 @@ PackageStore::PackageStore(const QJsonObject &profile)
     : m_installed(packagesFrom(profile.value(QLatin1String("installed")).toArray()))
     , m_available(packagesFrom(profile.value(QLatin1String("available")).toArray()))
 {
-    if (!QFile::exists(databaseFile))
-        fillDatabase(jsonOf(m_installed));
+    fillPackageDatabase(profile.value(QLatin1String("installed")).toArray());
 }
 
 QString PackageStore::idOf(const Package &package, bool installed)
@@ -311,7 +246,9 @@ PackageStore::Change PackageStore::removal(const QStringList &ids, bool allowDep
 
 void PackageStore::make(const Change &change, std::function<void(const QString &)> done)
 {
+    m_busy = true;
     const auto finish = [this, change, done](const QString &problem) {
+        m_busy = false;
         if (problem.isEmpty())
             apply(change);
         done(problem);

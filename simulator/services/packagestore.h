@@ -75,6 +75,8 @@ public:
     /** Makes the change, which others can see when @p done is called; @p problem is empty when all is well.
      */
     void make(const Change &change, std::function<void(const QString &problem)> done);
+    /** Whether a change is being made: it goes on when the daemon that asked for it is gone. */
+    bool isBusy() const { return m_busy; }
 
     /** Makes @p package available, in place of the same version of it. */
     void publish(const Package &package);
@@ -94,6 +96,7 @@ private:
 
     std::vector<Package> m_installed;
     std::vector<Package> m_available;
+    bool m_busy = false;
 };
 
 /** Whether @p left is an older version of the same package. */
