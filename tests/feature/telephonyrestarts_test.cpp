@@ -1,5 +1,6 @@
 // SPDX-License-Identifier: LGPL-2.1-or-later
 #include "phone.h"
+#include "servicerestarts.h"
 #include "signalsequence.h"
 #include "waiting.h"
 
@@ -9,8 +10,6 @@
 #include <corvanemdm/simvoicecallfilter.h>
 
 #include <QtCore/QElapsedTimer>
-#include <QtCore/QFile>
-#include <QtCore/QRandomGenerator>
 #include <QtTest/QtTest>
 
 using Corvane::Mdm::SimFilter;
@@ -27,8 +26,6 @@ const QStringList Expected{
     QStringLiteral("/ril_0 present voice data enabled pin:0 net:1 244051234567890"),
     QStringLiteral("/ril_1 present enabled pin:0 net:1 262021234567891"),
 };
-constexpr int Restarts = 100;
-constexpr quint32 Seed = 20261121;
 constexpr int LongestRunMicroseconds = 40000; // somewhat longer than until all states are known
 
 QStringList stateTexts(const SimInfo &info)
@@ -38,23 +35,6 @@ QStringList stateTexts(const SimInfo &info)
     for (const SimInfo::SimState &state : states)
         result.append(simStateText(state));
     return result;
-}
-
-/** Memory of this process that is in use, in KiB. */
-qint64 residentMemory()
-{
-    QFile status(QStringLiteral("/proc/self/statm"));
-    if (!status.open(QIODevice::ReadOnly))
-        return 0;
-    return status.readAll().split(' ').value(1).toLongLong() * 4;
-}
-
-void runFor(int microseconds)
-{
-    QElapsedTimer elapsed;
-    elapsed.start();
-    while (elapsed.nsecsElapsed() < qint64(microseconds) * 1000)
-        QCoreApplication::processEvents();
 }
 
 /** Whether both slots have come to their states; before that the ones of the run before are kept. */
@@ -81,7 +61,7 @@ private Q_SLOTS:
 void TelephonyRestartsTest::objectsSurvive()
 {
     Phone phone;
-    QRandomGenerator random(Seed);
+    ServiceRestarts restarts(phone, Service, LongestRunMicroseconds);
 
     SimInfo info;
     SimVoiceCallFilter calls;
@@ -104,26 +84,20 @@ void TelephonyRestartsTest::objectsSurvive()
     SignalSequence seen(&info);
     int cutShort = 0;
     qint64 slowest = 0;
-    qint64 memoryAtStart = 0;
-    for (int round = 0; round < Restarts; ++round) {
-        phone.stopService(Service);
+    for (int round = 0; round < restarts.rounds(); ++round) {
+        restarts.stop();
         QVERIFY(waitUntil([&] { return !info.available(); }));
         QCOMPARE(info.simSlotStates().size(), 2);
         QVERIFY(filtersAreReady());
         QVERIFY(filtersHaveTheRule());
-        runFor(random.bounded(LongestRunMicroseconds / 4));
 
         // A run that ends at any point of taking up the service...
         seen.take();
-        phone.startService(Service);
-        runFor(random.bounded(LongestRunMicroseconds));
+        restarts.runBriefly();
         cutShort += isTakenUp(seen.take()) ? 0 : 1;
-        phone.stopService(Service);
-        runFor(random.bounded(LongestRunMicroseconds / 4));
 
         // ... and one that lasts.
-        seen.take();
-        phone.startService(Service);
+        restarts.start();
         QElapsedTimer elapsed;
         elapsed.start();
         QVERIFY2(waitUntil([&] { return isTakenUp(seen.signalsSeen()); }),
@@ -142,13 +116,10 @@ void TelephonyRestartsTest::objectsSurvive()
         QVERIFY(seen.waitFor(2));
         phone.settle(Service);
         QCOMPARE(seen.take().size(), 2);
-        if (round == Restarts / 10)
-            memoryAtStart = residentMemory();
+        restarts.endRound();
     }
-    qInfo("%d restarts (seed %u), %d runs of the service cut short while it was taken up, slowest return to "
-          "all "
-          "states %lld ms, memory %+lld KiB since restart %d",
-          2 * Restarts, Seed, cutShort, slowest, residentMemory() - memoryAtStart, Restarts / 10);
+    qInfo("%s, %d runs of the service cut short while it was taken up, slowest return to all states %lld ms",
+          qPrintable(restarts.summary()), cutShort, slowest);
 }
 
 QTEST_GUILESS_MAIN(TelephonyRestartsTest)
