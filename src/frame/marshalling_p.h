@@ -21,7 +21,8 @@ namespace Mdm
 /**
  * Whether D-Bus has a type for @p value and for all that is in its lists and maps.
  *
- * QtDBus notices as well, but in the middle of writing, and then never frees the structures that are open.
+ * QtDBus notices as well, but in the middle of writing: it never frees the structures that are open then, and
+ * ends the program over a map.
  */
 inline bool isMarshallable(const QVariant &value)
 {

@@ -20,21 +20,10 @@
 #if __has_include(<corvanemdm/networkdatacounter.h>)
 #include <corvanemdm/networkdatacounter.h>
 #endif
-#if __has_include(<corvanemdm/provisioner.h>)
-#include <corvanemdm/provisioner.h>
-#endif
-#if __has_include(<corvanemdm/emailaccountprovisioner.h>)
-#include <corvanemdm/emailaccountprovisioner.h>
-#endif
-#if __has_include(<corvanemdm/genericaccountprovisioner.h>)
-#include <corvanemdm/genericaccountprovisioner.h>
-#endif
-#if __has_include(<corvanemdm/autostart.h>)
 #include <corvanemdm/autostart.h>
-#endif
-#if __has_include(<corvanemdm/certificates.h>)
 #include <corvanemdm/certificates.h>
-#endif
+#include <corvanemdm/emailaccountprovisioner.h>
+#include <corvanemdm/genericaccountprovisioner.h>
 #if __has_include(<corvanemdm/devicelock.h>)
 #include <corvanemdm/devicelock.h>
 #endif
@@ -106,14 +95,12 @@ template <> struct RandomArgument<AccessPoint> {
     }
 };
 
-#if __has_include(<corvanemdm/certificates.h>)
 template <> struct RandomArgument<QSslCertificate> {
     static QSslCertificate make(ArgumentSource &source)
     {
         return QSslCertificate(randomArgument<QByteArray>(source));
     }
 };
-#endif
 
 #define CALL(method) call(#method, &Tested::method)
 
@@ -236,43 +223,20 @@ TestedClass networkDataCounter()
 }
 #endif
 
-#if __has_include(<corvanemdm/provisioner.h>)
-/** The base class leaves one thing to be done. */
-class MinimalProvisioner : public Accounts::Provisioner
-{
-public:
-    using Provisioner::Provisioner;
-    bool createAccount() override { return false; }
-};
-
-TestedClass provisioner()
-{
-    using Tested = Accounts::Provisioner;
-    TestedClass tested = testedClass<MinimalProvisioner>(
-        "Provisioner", {CALL(deleteAccount), CALL(listAccounts), CALL(error), CALL(errorMessage)});
-    return tested;
-}
-#endif
-
-#if __has_include(<corvanemdm/emailaccountprovisioner.h>)
 TestedClass emailAccountProvisioner()
 {
     using Tested = Accounts::EmailAccountProvisioner;
     return testedClass<Tested>("EmailAccountProvisioner",
                                {CALL(createAccount), CALL(deleteAccount), CALL(listAccounts)});
 }
-#endif
 
-#if __has_include(<corvanemdm/genericaccountprovisioner.h>)
 TestedClass genericAccountProvisioner()
 {
     using Tested = Accounts::GenericAccountProvisioner;
     return testedClass<Tested>("GenericAccountProvisioner",
                                {CALL(createAccount), CALL(deleteAccount), CALL(listAccounts)});
 }
-#endif
 
-#if __has_include(<corvanemdm/autostart.h>)
 TestedClass autostart()
 {
     using Tested = Autostart;
@@ -282,9 +246,7 @@ TestedClass autostart()
                           }};
     return testedClass<Tested>("Autostart", {CALL(add), CALL(remove), query});
 }
-#endif
 
-#if __has_include(<corvanemdm/certificates.h>)
 TestedClass certificates()
 {
     using Tested = Certificates;
@@ -298,7 +260,6 @@ TestedClass certificates()
                                 call("blacklist", static_cast<Data>(&Tested::blacklist)),
                                 call("blacklist", static_cast<List>(&Tested::blacklist))});
 }
-#endif
 
 #if __has_include(<corvanemdm/devicelock.h>)
 TestedClass deviceLock()
@@ -366,21 +327,7 @@ const std::vector<TestedClass> &testedClasses()
 #if __has_include(<corvanemdm/networkdatacounter.h>)
             networkDataCounter(),
 #endif
-#if __has_include(<corvanemdm/provisioner.h>)
-            provisioner(),
-#endif
-#if __has_include(<corvanemdm/emailaccountprovisioner.h>)
-            emailAccountProvisioner(),
-#endif
-#if __has_include(<corvanemdm/genericaccountprovisioner.h>)
-            genericAccountProvisioner(),
-#endif
-#if __has_include(<corvanemdm/autostart.h>)
-            autostart(),
-#endif
-#if __has_include(<corvanemdm/certificates.h>)
-            certificates(),
-#endif
+            emailAccountProvisioner(), genericAccountProvisioner(), autostart(), certificates(),
 #if __has_include(<corvanemdm/devicelock.h>)
             deviceLock(),
 #endif
