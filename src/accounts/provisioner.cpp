@@ -1,15 +1,13 @@
 // SPDX-License-Identifier: LGPL-2.1-or-later
 #include "provisioner_p.h"
 
+#include "frame/marshalling_p.h"
 #include "frame/mdmproxy_p.h"
 
 #include <QtDBus/QDBusConnection>
 #include <QtDBus/QDBusMetaType>
 #include <QtDBus/QDBusPendingCall>
 #include <QtDBus/QDBusPendingReply>
-#include <QtDBus/QDBusUnixFileDescriptor>
-
-#include <algorithm>
 
 namespace Corvane
 {
@@ -40,35 +38,6 @@ void registerTypes()
     qRegisterMetaType<QList<Provisioner::AccountInfo>>(
         "QList<Corvane::Mdm::Accounts::Provisioner::AccountInfo>");
     qDBusRegisterMetaType<QList<Provisioner::AccountInfo>>();
-}
-
-bool canTravel(const QVariantList &values);
-
-/** Whether D-Bus has a form for @p value: QtDBus ends the program over a map with one that has none. */
-bool canTravel(const QVariant &value)
-{
-    const int type = value.userType();
-    if (type == QMetaType::QVariantMap)
-        return canTravel(value.toMap().values());
-    if (type == QMetaType::QVariantHash)
-        return canTravel(value.toHash().values());
-    if (type == QMetaType::QVariantList)
-        return canTravel(value.toList());
-    if (type == qMetaTypeId<QDBusVariant>())
-        return canTravel(value.value<QDBusVariant>().variant());
-    if (type == qMetaTypeId<QDBusObjectPath>())
-        return !value.value<QDBusObjectPath>().path().isEmpty();
-    if (type == qMetaTypeId<QDBusSignature>())
-        return !value.value<QDBusSignature>().signature().isEmpty();
-    if (type == qMetaTypeId<QDBusUnixFileDescriptor>())
-        return value.value<QDBusUnixFileDescriptor>().isValid();
-    return type != QMetaType::UnknownType && QDBusMetaType::typeToSignature(type);
-}
-
-bool canTravel(const QVariantList &values)
-{
-    return std::all_of(values.cbegin(), values.cend(),
-                       [](const QVariant &value) { return canTravel(value); });
 }
 
 /** The value at @p index if it is a T: Qt would take "true" for a bool, and 7 for a string. */
@@ -121,7 +90,7 @@ bool ProvisionerPrivate::canCreateAccount() const
 
 QVariantList ProvisionerPrivate::call(const QString &method, const QVariantList &arguments)
 {
-    if (!canTravel(arguments)) {
+    if (!isMarshallable(arguments)) {
         return {QVariant(), QStringLiteral("The account configuration has a value that D-Bus cannot carry"),
                 LocalError};
     }

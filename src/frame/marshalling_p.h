@@ -6,6 +6,9 @@
 #include <QtCore/QVariantList>
 #include <QtCore/QVariantMap>
 #include <QtDBus/QDBusMetaType>
+#include <QtDBus/QDBusObjectPath>
+#include <QtDBus/QDBusSignature>
+#include <QtDBus/QDBusUnixFileDescriptor>
 #include <QtDBus/QDBusVariant>
 
 #include <algorithm>
@@ -18,7 +21,8 @@ namespace Mdm
 /**
  * Whether D-Bus has a type for @p value and for all that is in its lists and maps.
  *
- * QtDBus notices as well, but in the middle of writing, and then never frees the structures that are open.
+ * QtDBus notices as well, but in the middle of writing: it never frees the structures that are open then, and
+ * ends the program over a map.
  */
 inline bool isMarshallable(const QVariant &value)
 {
@@ -33,6 +37,12 @@ inline bool isMarshallable(const QVariant &value)
         return all(value.toHash());
     if (value.userType() == qMetaTypeId<QDBusVariant>())
         return isMarshallable(value.value<QDBusVariant>().variant());
+    if (value.userType() == qMetaTypeId<QDBusObjectPath>())
+        return !value.value<QDBusObjectPath>().path().isEmpty();
+    if (value.userType() == qMetaTypeId<QDBusSignature>())
+        return !value.value<QDBusSignature>().signature().isEmpty();
+    if (value.userType() == qMetaTypeId<QDBusUnixFileDescriptor>())
+        return value.value<QDBusUnixFileDescriptor>().isValid();
     return value.isValid() && QDBusMetaType::typeToSignature(value.userType());
 }
 

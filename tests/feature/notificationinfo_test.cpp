@@ -10,6 +10,9 @@
 #include <QtCore/QTimeZone>
 #include <QtDBus/QDBusArgument>
 #include <QtDBus/QDBusMetaType>
+#include <QtDBus/QDBusObjectPath>
+#include <QtDBus/QDBusSignature>
+#include <QtDBus/QDBusUnixFileDescriptor>
 #include <QtDBus/QDBusVariant>
 #include <QtTest/QtTest>
 
@@ -578,6 +581,9 @@ void NotificationInfoTest::actionsThatCannotBeSent_data()
     QTest::newRow("in a map") << QVariantList{QVariantMap{{key, QVariant()}}};
     QTest::newRow("in a list in a hash") << QVariantList{QVariantHash{{key, QVariantList{1, QVariant()}}}};
     QTest::newRow("of a type that the wire does not have") << QVariantList{QVariantMap{{key, unknown}}};
+    QTest::newRow("empty path") << QVariantList{variant(QDBusObjectPath())};
+    QTest::newRow("empty signature") << QVariantList{variant(QDBusSignature())};
+    QTest::newRow("no file") << QVariantList{variant(QDBusUnixFileDescriptor())};
     QTest::newRow("in a box") << QVariantList{variant(QDBusVariant(unknown))};
 }
 

@@ -1,6 +1,6 @@
 // SPDX-License-Identifier: LGPL-2.1-or-later
-#include "endurance.h"
 #include "phone.h"
+#include "servicerestarts.h"
 #include "signalsequence.h"
 #include "waiting.h"
 
@@ -27,8 +27,6 @@ const QStringList Expected{
     QStringLiteral("/ril_0 present voice data enabled pin:0 net:1 244051234567890"),
     QStringLiteral("/ril_1 present enabled pin:0 net:1 262021234567891"),
 };
-constexpr int Restarts = 100;
-constexpr quint32 Seed = 20261121;
 constexpr int LongestRunMicroseconds = 40000; // somewhat longer than until all states are known
 
 QStringList stateTexts(const SimInfo &info)
@@ -64,7 +62,7 @@ private Q_SLOTS:
 void TelephonyRestartsTest::objectsSurvive()
 {
     Phone phone;
-    QRandomGenerator random(Seed);
+    ServiceRestarts restarts(phone, Service, LongestRunMicroseconds);
 
     SimInfo info;
     SimVoiceCallFilter calls;
@@ -87,26 +85,20 @@ void TelephonyRestartsTest::objectsSurvive()
     SignalSequence seen(&info);
     int cutShort = 0;
     qint64 slowest = 0;
-    qint64 memoryAtStart = 0;
-    for (int round = 0; round < Restarts; ++round) {
-        phone.stopService(Service);
+    for (int round = 0; round < restarts.rounds(); ++round) {
+        restarts.stop();
         QVERIFY(waitUntil([&] { return !info.available(); }));
         QCOMPARE(info.simSlotStates().size(), 2);
         QVERIFY(filtersAreReady());
         QVERIFY(filtersHaveTheRule());
-        runFor(random.bounded(LongestRunMicroseconds / 4));
 
         // A run that ends at any point of taking up the service...
         seen.take();
-        phone.startService(Service);
-        runFor(random.bounded(LongestRunMicroseconds));
+        restarts.runBriefly();
         cutShort += isTakenUp(seen.take()) ? 0 : 1;
-        phone.stopService(Service);
-        runFor(random.bounded(LongestRunMicroseconds / 4));
 
         // ... and one that lasts.
-        seen.take();
-        phone.startService(Service);
+        restarts.start();
         QElapsedTimer elapsed;
         elapsed.start();
         QVERIFY2(waitUntil([&] { return isTakenUp(seen.signalsSeen()); }),
@@ -125,13 +117,10 @@ void TelephonyRestartsTest::objectsSurvive()
         QVERIFY(seen.waitFor(2));
         phone.settle(Service);
         QCOMPARE(seen.take().size(), 2);
-        if (round == Restarts / 10)
-            memoryAtStart = residentMemory();
+        restarts.endRound();
     }
-    qInfo("%d restarts (seed %u), %d runs of the service cut short while it was taken up, slowest return to "
-          "all "
-          "states %lld ms, memory %+lld KiB since restart %d",
-          2 * Restarts, Seed, cutShort, slowest, residentMemory() - memoryAtStart, Restarts / 10);
+    qInfo("%s, %d runs of the service cut short while it was taken up, slowest return to all states %lld ms",
+          qPrintable(restarts.summary()), cutShort, slowest);
 }
 
 QTEST_GUILESS_MAIN(TelephonyRestartsTest)

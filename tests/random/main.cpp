@@ -63,8 +63,7 @@ int main(int argc, char *argv[])
          QStringLiteral("0")},
         {patience, QStringLiteral("seconds of silence that are a hang"), QStringLiteral("number"),
          QStringLiteral("60")},
-        {oneClass, QStringLiteral("only lives that begin with this class; may be repeated"),
-         QStringLiteral("name")},
+        {oneClass, QStringLiteral("only this class; may be given several times"), QStringLiteral("name")},
         {list, QStringLiteral("list the classes")},
         {verbose, QStringLiteral("tell every message, call and warning")},
     });
@@ -73,8 +72,9 @@ int main(int argc, char *argv[])
     parser.addOption(subjectOption);
     parser.process(application);
 
+    const QStringList classes = parser.isSet(oneClass) ? parser.values(oneClass) : classNames();
     if (parser.isSet(subject))
-        return runSubject(parser.isSet(verbose));
+        return runSubject(classes, parser.isSet(verbose));
     if (parser.isSet(list)) {
         std::puts(qUtf8Printable(classNames().join(QLatin1Char('\n'))));
         return 0;
@@ -88,7 +88,7 @@ int main(int argc, char *argv[])
     settings.patience = int(numberOf(parser, patience));
     settings.verbose = parser.isSet(verbose);
     settings.hasAllClasses = !parser.isSet(oneClass);
-    settings.classes = parser.isSet(oneClass) ? parser.values(oneClass) : classNames();
+    settings.classes = classes;
     for (const QString &name : qAsConst(settings.classes)) {
         if (!classNames().contains(name)) {
             std::fprintf(stderr, "there is no class %s; --classes lists them\n", qUtf8Printable(name));
@@ -99,6 +99,8 @@ int main(int argc, char *argv[])
     QByteArrayList arguments{"--subject"};
     if (settings.verbose)
         arguments.append("--verbose");
+    for (const QString &name : parser.values(oneClass))
+        arguments.append("--class=" + name.toUtf8());
     Stranger stranger(settings);
     return stranger.run(QCoreApplication::applicationFilePath().toLocal8Bit(), arguments);
 }

@@ -93,7 +93,10 @@ void PhoneRecord::findServices()
     const Variant services(g_variant_get_child_value(reply.get(), 0));
     for (gsize i = 0; i < g_variant_n_children(services.get()); ++i) {
         const gchar *name = nullptr;
-        g_variant_get_child(services.get(), i, "(&sb)", &name, nullptr);
+        gboolean isRunning = false;
+        g_variant_get_child(services.get(), i, "(&sb)", &name, &isRunning);
+        if (!isRunning)
+            qFatal("%s is stopped: start it, or take another phone", name);
         m_services.append(name);
     }
 }

@@ -14,6 +14,32 @@
 #include <corvanemdm/simvoicecallfilter.h>
 #include <corvanemdm/softwareupdate.h>
 
+#if __has_include(<corvanemdm/netproxy.h>)
+#include <corvanemdm/netproxy.h>
+#endif
+#if __has_include(<corvanemdm/networkdatacounter.h>)
+#include <corvanemdm/networkdatacounter.h>
+#endif
+#include <corvanemdm/autostart.h>
+#include <corvanemdm/certificates.h>
+#include <corvanemdm/emailaccountprovisioner.h>
+#include <corvanemdm/genericaccountprovisioner.h>
+#if __has_include(<corvanemdm/devicelock.h>)
+#include <corvanemdm/devicelock.h>
+#endif
+#if __has_include(<corvanemdm/securitysettings.h>)
+#include <corvanemdm/securitysettings.h>
+#endif
+#if __has_include(<corvanemdm/datetimesettings.h>)
+#include <corvanemdm/datetimesettings.h>
+#endif
+#if __has_include(<corvanemdm/locationsettings.h>)
+#include <corvanemdm/locationsettings.h>
+#endif
+#if __has_include(<corvanemdm/batteryinfo.h>)
+#include <corvanemdm/batteryinfo.h>
+#endif
+
 using namespace Corvane::Mdm;
 
 template <> struct RandomArgument<SimFilter::Rule> {
@@ -66,6 +92,13 @@ template <> struct RandomArgument<AccessPoint> {
             *text = randomArgument<QString>(source);
         }
         return settings;
+    }
+};
+
+template <> struct RandomArgument<QSslCertificate> {
+    static QSslCertificate make(ArgumentSource &source)
+    {
+        return QSslCertificate(randomArgument<QByteArray>(source));
     }
 };
 
@@ -172,23 +205,144 @@ TestedClass connectivitySettings()
     return tested;
 }
 
+#if __has_include(<corvanemdm/netproxy.h>)
+TestedClass netProxy()
+{
+    using Tested = NetProxy;
+    return testedClass<Tested>(
+        "NetProxy",
+        {CALL(selectProxy), CALL(getIdentifier), CALL(getName), CALL(getIdentifiers), CALL(getTechnologies)});
+}
+#endif
+
+#if __has_include(<corvanemdm/networkdatacounter.h>)
+TestedClass networkDataCounter()
+{
+    using Tested = NetworkDataCounter;
+    return testedClass<Tested>("NetworkDataCounter", {CALL(setActive), CALL(resetCounter)});
+}
+#endif
+
+TestedClass emailAccountProvisioner()
+{
+    using Tested = Accounts::EmailAccountProvisioner;
+    return testedClass<Tested>("EmailAccountProvisioner",
+                               {CALL(createAccount), CALL(deleteAccount), CALL(listAccounts)});
+}
+
+TestedClass genericAccountProvisioner()
+{
+    using Tested = Accounts::GenericAccountProvisioner;
+    return testedClass<Tested>("GenericAccountProvisioner",
+                               {CALL(createAccount), CALL(deleteAccount), CALL(listAccounts)});
+}
+
+TestedClass autostart()
+{
+    using Tested = Autostart;
+    const Operation query{"query", [](QObject *object, ArgumentSource &) {
+                              Autostart::Result result = Autostart::Success;
+                              static_cast<Autostart *>(object)->query(result);
+                          }};
+    return testedClass<Tested>("Autostart", {CALL(add), CALL(remove), query});
+}
+
+TestedClass certificates()
+{
+    using Tested = Certificates;
+    using Data = void (Tested::*)(const QString &, const QByteArray &);
+    using List = void (Tested::*)(const QString &, const QList<QSslCertificate> &);
+    return testedClass<Tested>("Certificates",
+                               {CALL(certificates), CALL(installedFiles), CALL(blacklistedFiles),
+                                CALL(uninstall), CALL(unblacklist),
+                                call("install", static_cast<Data>(&Tested::install)),
+                                call("install", static_cast<List>(&Tested::install)),
+                                call("blacklist", static_cast<Data>(&Tested::blacklist)),
+                                call("blacklist", static_cast<List>(&Tested::blacklist))});
+}
+
+#if __has_include(<corvanemdm/devicelock.h>)
+TestedClass deviceLock()
+{
+    using Tested = DeviceLock;
+    return testedClass<Tested>(
+        "DeviceLock",
+        {CALL(isHomeEncrypted), CALL(setLockoutMode), CALL(clearDevice), CALL(setSecurityCode)});
+}
+#endif
+
+#if __has_include(<corvanemdm/securitysettings.h>)
+TestedClass securitySettings()
+{
+    using Tested = SecuritySettings;
+    return testedClass<Tested>("SecuritySettings",
+                               {CALL(developerModeEnabled), CALL(setDeveloperModeEnabled),
+                                CALL(sideloadingAllowed), CALL(setSideloadingAllowed)});
+}
+#endif
+
+#if __has_include(<corvanemdm/datetimesettings.h>)
+TestedClass dateTimeSettings()
+{
+    using Tested = DateTimeSettings;
+    return testedClass<Tested>("DateTimeSettings", {CALL(setTime), CALL(setDate), CALL(supportedTimeZones)});
+}
+#endif
+
+#if __has_include(<corvanemdm/locationsettings.h>)
+TestedClass locationSettings()
+{
+    using Tested = LocationSettings;
+    TestedClass tested = testedClass<Tested>("LocationSettings",
+                                             {CALL(agpsAvailable), CALL(availableAgpsProviders),
+                                              CALL(agpsEnabled), CALL(agpsAgreementAccepted),
+                                              CALL(setAgpsEnabled), CALL(setAgpsAgreementAccepted),
+                                              CALL(allowDataSource), CALL(disallowDataSource)});
+    tested.create = [](QObject *parent, ArgumentSource &source) -> QObject * {
+        return new Tested(randomArgument<Tested::Mode>(source), parent);
+    };
+    return tested;
+}
+#endif
+
+#if __has_include(<corvanemdm/batteryinfo.h>)
+TestedClass batteryInfo()
+{
+    return testedClass<BatteryInfo>("BatteryInfo", {});
+}
+#endif
+
 } // namespace
 
 const std::vector<TestedClass> &testedClasses()
 {
-    static const std::vector<TestedClass> classes{
-        simInfo(),
-        simVoiceCallFilter(),
-        simSmsFilter(),
-        simMobileDataFilter(),
-        testedClass<SimFilter>("SimFilter", {}),
-        callStatistics(),
-        notificationInfo(),
-        softwareUpdate(),
-        locationInfo(),
-        connectivitySettings(),
-        applications(),
-        applicationOperation(),
+    static const std::vector<TestedClass> classes
+    {
+        simInfo(), simVoiceCallFilter(), simSmsFilter(), simMobileDataFilter(),
+            testedClass<SimFilter>("SimFilter", {}), callStatistics(), notificationInfo(), softwareUpdate(),
+            locationInfo(), connectivitySettings(), applications(), applicationOperation(),
+#if __has_include(<corvanemdm/netproxy.h>)
+            netProxy(),
+#endif
+#if __has_include(<corvanemdm/networkdatacounter.h>)
+            networkDataCounter(),
+#endif
+            emailAccountProvisioner(), genericAccountProvisioner(), autostart(), certificates(),
+#if __has_include(<corvanemdm/devicelock.h>)
+            deviceLock(),
+#endif
+#if __has_include(<corvanemdm/securitysettings.h>)
+            securitySettings(),
+#endif
+#if __has_include(<corvanemdm/datetimesettings.h>)
+            dateTimeSettings(),
+#endif
+#if __has_include(<corvanemdm/locationsettings.h>)
+            locationSettings(),
+#endif
+#if __has_include(<corvanemdm/batteryinfo.h>)
+            batteryInfo(),
+#endif
     };
     return classes;
 }

@@ -5,7 +5,9 @@
 #include "controlnames.h"
 #include "drivernames.h"
 
+#include <QtCore/QDir>
 #include <QtCore/QFile>
+#include <QtCore/QFileInfo>
 
 #include <gio/gunixfdlist.h>
 
@@ -23,6 +25,9 @@ namespace ControlNames = Corvane::Simulator::ControlNames;
 
 namespace
 {
+
+const char socketService[] = "org.veldmobile.devicelock";
+const char socketPath[] = "/run/veld-devicelock/socket";
 
 constexpr std::size_t rememberedMessages = 12;
 constexpr guint longestHold = 20; // milliseconds; a client that blocks waits no longer
@@ -74,6 +79,12 @@ Stranger::~Stranger()
     if (m_heldTimer)
         g_source_remove(m_heldTimer);
     m_held.clear();
+    // The phone is left as it was found.
+    for (const QByteArray &service : m_record->services()) {
+        if (!m_namesAway.contains(service))
+            setServicePresent(service, false);
+        control("StartService", service);
+    }
     g_dbus_connection_close_sync(m_bus.get(), nullptr, nullptr);
     g_main_loop_unref(m_loop);
 }
@@ -82,16 +93,21 @@ Stranger::~Stranger()
 void Stranger::takeOver()
 {
     for (const QByteArray &service : m_record->services()) {
-        ErrorSlot error;
-        const Variant reply(g_dbus_connection_call_sync(
-            m_bus.get(), ControlNames::service, ControlNames::path, ControlNames::interface, "StopService",
-            g_variant_new("(s)", service.constData()), nullptr, G_DBUS_CALL_FLAGS_NONE, -1, nullptr, &error));
-        if (!reply)
-            qFatal("%s cannot be stopped: %s", service.constData(), error->message);
-        setNameOwned(service, true);
+        control("StopService", service);
+        setServicePresent(service, true);
     }
     setNameOwned(DriverNames::service, true);
     listen(m_bus.get());
+}
+
+void Stranger::control(const char *method, const QByteArray &service)
+{
+    ErrorSlot error;
+    const Variant reply(g_dbus_connection_call_sync(
+        m_bus.get(), ControlNames::service, ControlNames::path, ControlNames::interface, method,
+        g_variant_new("(s)", service.constData()), nullptr, G_DBUS_CALL_FLAGS_NONE, -1, nullptr, &error));
+    if (!reply)
+        qFatal("%s of %s: %s", method, service.constData(), error->message);
 }
 
 void Stranger::listen(GDBusConnection *connection)
@@ -117,6 +133,55 @@ void Stranger::listen(GDBusConnection *connection)
             return nullptr;
         },
         this, nullptr);
+}
+
+void Stranger::setSocketOpen(bool isOpen)
+{
+    if (!isOpen) {
+        for (const Pointer<GDBusConnection> &peer : m_peers) {
+            g_signal_handlers_disconnect_by_data(peer.get(), this);
+            g_dbus_connection_close_sync(peer.get(), nullptr, nullptr);
+        }
+        m_peers.clear();
+        if (m_socket)
+            g_dbus_server_stop(m_socket.get());
+        m_socket.reset();
+        QFile::remove(QLatin1String(socketPath));
+        return;
+    }
+    QDir().mkpath(QFileInfo(QLatin1String(socketPath)).path());
+    const GCharPointer id(g_dbus_generate_guid());
+    ErrorSlot error;
+    m_socket.reset(g_dbus_server_new_sync((QByteArray("unix:path=") + socketPath).constData(),
+                                          G_DBUS_SERVER_FLAGS_NONE, id.get(), nullptr, nullptr, &error));
+    if (!m_socket)
+        qFatal("nobody can be let in at %s: %s", socketPath, error->message);
+    g_signal_connect(m_socket.get(), "new-connection",
+                     G_CALLBACK(+[](GDBusServer *, GDBusConnection *peer, gpointer data) -> gboolean {
+                         static_cast<Stranger *>(data)->acceptPeer(peer);
+                         return TRUE;
+                     }),
+                     this);
+    g_dbus_server_start(m_socket.get());
+}
+
+void Stranger::acceptPeer(GDBusConnection *peer)
+{
+    listen(peer);
+    g_signal_connect(peer, "closed",
+                     G_CALLBACK(+[](GDBusConnection *closed, gboolean, GError *, gpointer data) {
+                         static_cast<Stranger *>(data)->forgetPeer(closed);
+                     }),
+                     this);
+    m_peers.emplace_back(G_DBUS_CONNECTION(g_object_ref(peer)));
+}
+
+void Stranger::forgetPeer(GDBusConnection *peer)
+{
+    const auto isIt = [peer](const Pointer<GDBusConnection> &each) {
+        return each.get() == peer;
+    };
+    m_peers.erase(std::remove_if(m_peers.begin(), m_peers.end(), isIt), m_peers.end());
 }
 
 int Stranger::run(const QByteArray &subject, const QByteArrayList &arguments)
@@ -255,7 +320,7 @@ Variant Stranger::nextLife()
 {
     // All services are there at the beginning of a life.
     while (!m_namesAway.isEmpty())
-        setNameOwned(m_namesAway.takeLast(), true);
+        setServicePresent(m_namesAway.takeLast(), true);
     const quint64 messages = m_answers + m_signals + m_calls;
     if (m_livesLived > 0)
         ++m_life;
@@ -422,10 +487,14 @@ void Stranger::sendSignal(Random &random)
     const QByteArray path = random.chance(5) ? m_record->values().objectPath(random) : offer.path;
     const Pointer<GDBusMessage> signal(
         g_dbus_message_new_signal(path.constData(), name.constData(), member.constData()));
+    GDBusConnection *connection = m_bus.get();
     // To the subject alone: none is lost because nobody has asked the bus for it.
-    g_dbus_message_set_destination(signal.get(), m_subjectName.constData());
+    if (offer.service == socketService && !m_peers.empty())
+        connection = random.pick(m_peers).get();
+    else
+        g_dbus_message_set_destination(signal.get(), m_subjectName.constData());
     ++m_signals;
-    send(m_bus.get(), signal.get(), argumentsOf(signature, random), "signal " + describe(signal.get()));
+    send(connection, signal.get(), argumentsOf(signature, random), "signal " + describe(signal.get()));
 }
 
 /** Calls an object of the subject's own, if it has told of any. */
@@ -458,15 +527,22 @@ bool Stranger::sendCall(Random &random)
 void Stranger::flipName(Random &random)
 {
     if (!m_namesAway.isEmpty() && random.chance(30)) {
-        setNameOwned(m_namesAway.takeFirst(), true);
+        setServicePresent(m_namesAway.takeFirst(), true);
     } else if (random.chance(3)) {
         const QByteArray name = offerToSignal(random).service;
         if (m_namesAway.contains(name))
             return;
         ++m_departures;
-        setNameOwned(name, false);
+        setServicePresent(name, false);
         m_namesAway.append(name);
     }
+}
+
+void Stranger::setServicePresent(const QByteArray &service, bool isPresent)
+{
+    setNameOwned(service, isPresent);
+    if (service == socketService)
+        setSocketOpen(isPresent);
 }
 
 void Stranger::setNameOwned(const QByteArray &name, bool isOwned)
@@ -510,7 +586,9 @@ void Stranger::send(GDBusConnection *connection, GDBusMessage *message, const Va
         std::fprintf(stderr, "  %s %.400s\n", m_last.back().what.constData(), printed ? printed.get() : "");
     }
     ErrorSlot problem;
-    if (!g_dbus_connection_send_message(connection, message, G_DBUS_SEND_MESSAGE_FLAGS_NONE, nullptr,
-                                        &problem))
+    // A peer may have left.
+    if (!g_dbus_connection_is_closed(connection)
+        && !g_dbus_connection_send_message(connection, message, G_DBUS_SEND_MESSAGE_FLAGS_NONE, nullptr,
+                                           &problem))
         qWarning("%s is not sent: %s", what.constData(), problem->message);
 }

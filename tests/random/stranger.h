@@ -57,7 +57,11 @@ private:
     };
 
     void takeOver();
+    void control(const char *method, const QByteArray &service);
     void listen(GDBusConnection *connection);
+    void setSocketOpen(bool isOpen);
+    void acceptPeer(GDBusConnection *peer);
+    void forgetPeer(GDBusConnection *peer);
     bool startSubject(const QByteArray &subject, const QByteArrayList &arguments);
     void subjectEnded(int waitStatus);
     void watchForHangs();
@@ -77,6 +81,7 @@ private:
     bool sendCall(Random &random);
     const Offer &offerToSignal(Random &random) const;
     void flipName(Random &random);
+    void setServicePresent(const QByteArray &service, bool isPresent);
     void setNameOwned(const QByteArray &name, bool isOwned);
     void send(GDBusConnection *connection, GDBusMessage *message, const Variant &arguments,
               const QByteArray &what);
@@ -102,6 +107,8 @@ private:
     std::map<QString, std::set<QByteArray>> m_touched; ///< services and interfaces that a class has called
     QByteArrayList m_clientPaths; ///< objects of the subject that it has told of in this life
     QByteArrayList m_namesAway;
+    Pointer<GDBusServer> m_socket; ///< of the one service that is asked over a connection of its own
+    std::vector<Pointer<GDBusConnection>> m_peers;
     std::deque<Held> m_held;
     guint m_heldTimer = 0;
 

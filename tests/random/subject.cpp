@@ -87,7 +87,8 @@ QVariant valueFor(const QMetaProperty &property, ArgumentSource &source)
 class Life
 {
 public:
-    Life(quint64 seed, quint64 number, const QString &firstClass, const QStringList &words);
+    Life(quint64 seed, quint64 number, const QString &firstClass, const QStringList &classes,
+         const QStringList &words);
     void live();
 
 private:
@@ -100,7 +101,8 @@ private:
 
     Random m_random;
     ArgumentSource m_arguments;
-    const TestedClass *m_first;
+    std::vector<const TestedClass *> m_classes;
+    const TestedClass *m_first = nullptr;
     QObject m_parent;
     std::vector<std::unique_ptr<Member>> m_members;
 };
@@ -188,14 +190,16 @@ void Life::Member::writeProperty()
     --m_underWay;
 }
 
-Life::Life(quint64 seed, quint64 number, const QString &firstClass, const QStringList &words)
+Life::Life(quint64 seed, quint64 number, const QString &firstClass, const QStringList &classes,
+           const QStringList &words)
     : m_random(seed, number, "life")
     , m_arguments{m_random, words}
-    , m_first(nullptr)
 {
     for (const TestedClass &tested : testedClasses()) {
         if (firstClass == QLatin1String(tested.name))
             m_first = &tested;
+        if (classes.contains(QLatin1String(tested.name)))
+            m_classes.push_back(&tested);
     }
     if (!m_first)
         qFatal("there is no class %s", qUtf8Printable(firstClass));
@@ -217,7 +221,7 @@ void Life::step()
     prune();
     const int choice = m_random.below(20);
     if (m_members.empty() || choice == 0) {
-        create(choice < 10 ? *m_first : m_random.pick(testedClasses()));
+        create(choice < 10 ? *m_first : *m_random.pick(m_classes));
         return;
     }
     const auto index = std::size_t(m_random.below(int(m_members.size())));
@@ -279,7 +283,7 @@ void dropMessage(QtMsgType type, const QMessageLogContext &, const QString &mess
 
 } // namespace
 
-int runSubject(bool verbose)
+int runSubject(const QStringList &classes, bool verbose)
 {
     s_isVerbose = verbose;
     qInstallMessageHandler(dropMessage);
@@ -290,7 +294,7 @@ int runSubject(bool verbose)
         const QString firstClass = next.value(2).toString();
         if (firstClass.isEmpty())
             break;
-        Life(next.value(0).toULongLong(), next.value(1).toULongLong(), firstClass, words).live();
+        Life(next.value(0).toULongLong(), next.value(1).toULongLong(), firstClass, classes, words).live();
         if (lives % livesBetweenLeakChecks == 0)
             checkForLeaks();
     }

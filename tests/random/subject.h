@@ -2,7 +2,10 @@
 #ifndef CORVANE_TEST_SUBJECT_H
 #define CORVANE_TEST_SUBJECT_H
 
-/** Lives the lives that the stranger gives it; returns the exit status of the process. */
-int runSubject(bool verbose);
+#include <QtCore/QStringList>
+
+/** Lives the lives that the stranger gives it, with objects of @p classes; returns the exit status of the
+ * process. */
+int runSubject(const QStringList &classes, bool verbose);
 
 #endif // CORVANE_TEST_SUBJECT_H

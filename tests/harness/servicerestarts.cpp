@@ -1,0 +1,86 @@
+// SPDX-License-Identifier: LGPL-2.1-or-later
+#include "servicerestarts.h"
+
+#include <QtCore/QCoreApplication>
+#include <QtCore/QElapsedTimer>
+#include <QtCore/QFile>
+
+namespace
+{
+
+constexpr int usualRounds = 100;
+constexpr quint32 usualSeed = 20261121;
+
+int numberFromEnvironment(const char *name, int usual)
+{
+    bool isNumber = false;
+    const int number = qEnvironmentVariableIntValue(name, &isNumber);
+    return isNumber ? number : usual;
+}
+
+/** Memory of this process that is in use, in KiB. */
+qint64 residentMemory()
+{
+    QFile status(QStringLiteral("/proc/self/statm"));
+    if (!status.open(QIODevice::ReadOnly))
+        return 0;
+    return status.readAll().split(' ').value(1).toLongLong() * 4;
+}
+
+} // namespace
+
+ServiceRestarts::ServiceRestarts(Phone &phone, const QString &service, int longestRun)
+    : m_phone(phone)
+    , m_service(service)
+    , m_longestRun(longestRun)
+    , m_rounds(numberFromEnvironment("CORVANE_RESTARTS", 2 * usualRounds) / 2)
+    , m_seed(quint32(numberFromEnvironment("CORVANE_SEED", usualSeed)))
+    , m_random(m_seed)
+{
+}
+
+void ServiceRestarts::stop()
+{
+    m_phone.stopService(m_service);
+}
+
+void ServiceRestarts::runBriefly()
+{
+    passTime(m_longestRun / 4);
+    m_phone.startService(m_service);
+    ++m_restarts;
+    passTime(m_longestRun);
+    m_phone.stopService(m_service);
+    // What the run has left behind arrives now, and not with the next one.
+    passTime(m_longestRun / 4);
+}
+
+void ServiceRestarts::start()
+{
+    m_phone.startService(m_service);
+    ++m_restarts;
+}
+
+void ServiceRestarts::endRound()
+{
+    if (++m_roundsEnded == m_rounds / 10)
+        m_memoryAtStart = residentMemory();
+}
+
+QString ServiceRestarts::summary() const
+{
+    const qint64 growth = m_memoryAtStart ? residentMemory() - m_memoryAtStart : 0;
+    return QString::asprintf("%d restarts (seed %u), memory %+lld KiB since restart %d", m_restarts, m_seed,
+                             growth, m_rounds / 10 * 2);
+}
+
+void ServiceRestarts::passTime(int mostMicroseconds)
+{
+    const qint64 nanoseconds = qint64(m_random.bounded(mostMicroseconds)) * 1000;
+    QElapsedTimer elapsed;
+    elapsed.start();
+    // Once at least: what came before the service had stopped is here already.
+    do {
+        QCoreApplication::processEvents();
+    } while (elapsed.nsecsElapsed() < nanoseconds);
+}
