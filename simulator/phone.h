@@ -31,6 +31,14 @@ struct Sim {
     bool isUsable() const;
 };
 
+struct Battery {
+    bool isPresent = false;
+    double percentage = 0; ///< 0 to 100
+    bool hasCharger = false; ///< that is connected
+
+    QJsonObject describe() const;
+};
+
 /** What several services know of the phone. */
 class Phone
 {
@@ -46,6 +54,7 @@ public:
 
     std::vector<Sim> sims; ///< by slot
     QJsonArray installedPackages; ///< when the phone was new, in the profile's words
+    Battery battery;
     CellularLinks cellularLinks;
 
 private:

@@ -2,6 +2,7 @@
 #include "realdaemons.h"
 
 #include "atmodem/emulatedmodems.h"
+#include "emulatedbattery.h"
 #include "networkcables.h"
 #include "packageauthority.h"
 
@@ -68,6 +69,21 @@ RealDaemon packageKit()
     };
 }
 
+RealDaemon upower()
+{
+    return {
+        QStringLiteral("upower"),
+        {QStringLiteral("org.freedesktop.UPower")},
+        {"/usr/bin/umockdev-run", "-d", EmulatedBattery::descriptionFile(), "--", "/usr/libexec/upowerd"},
+        "umockdev, and upower",
+        {"/var/lib/upower"},
+        {},
+        [](Phone &phone) -> std::unique_ptr<DaemonHardware> {
+            return std::make_unique<EmulatedBattery>(phone.battery);
+        },
+    };
+}
+
 } // namespace
 
 std::string RealDaemon::logFile() const
@@ -78,7 +94,7 @@ std::string RealDaemon::logFile() const
 const std::vector<RealDaemon> &realDaemons()
 {
     static const std::vector<RealDaemon> daemons{
-        ofonoWithOurPlugin(), stockOfono(QStringLiteral("stock-ofono")), connman(), packageKit()};
+        ofonoWithOurPlugin(), stockOfono(QStringLiteral("stock-ofono")), connman(), packageKit(), upower()};
     return daemons;
 }
 

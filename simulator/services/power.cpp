@@ -32,10 +32,8 @@ constexpr double action = 2;
 class Power : public Component
 {
 public:
-    explicit Power(const QJsonObject &profile)
-        : m_isPresent(profile.value(QLatin1String("present")).toBool())
-        , m_percentage(profile.value(QLatin1String("percentage")).toDouble())
-        , m_hasCharger(profile.value(QLatin1String("charger")).toBool())
+    explicit Power(Battery &battery)
+        : m_battery(battery)
     {
     }
 
@@ -47,16 +45,14 @@ public:
 private:
     State state() const;
     Warning warning() const;
-    Properties power() const { return {{QStringLiteral("OnBattery"), fromBool(!m_hasCharger)}}; }
+    Properties power() const { return {{QStringLiteral("OnBattery"), fromBool(!m_battery.hasCharger)}}; }
     Properties device() const;
     PropertyReaders deviceReaders() const;
     void announce();
     QString setLevel(const QString &text);
     QString setCharger(const QString &word);
 
-    const bool m_isPresent;
-    double m_percentage;
-    bool m_hasCharger;
+    Battery &m_battery;
 
     Service *m_service = nullptr;
     PropertyChanges m_toldOfPower;
@@ -72,7 +68,7 @@ void Power::attach(Service &service)
          [this](MethodCall &call) {
              GVariantBuilder paths;
              g_variant_builder_init(&paths, G_VARIANT_TYPE_OBJECT_PATH_ARRAY);
-             if (m_isPresent)
+             if (m_battery.isPresent)
                  g_variant_builder_add(&paths, "o", batteryPath.data());
              call.reply(g_variant_new("(ao)", &paths));
          }},
@@ -87,10 +83,10 @@ void Power::attach(Service &service)
                             return g_variant_new_string("0.99.20");
                         }},
                        {QStringLiteral("OnBattery"), [this] {
-                            return g_variant_new_boolean(!m_hasCharger);
+                            return g_variant_new_boolean(!m_battery.hasCharger);
                         }}});
     service.addObject(displayPath, deviceInterface, {}, deviceReaders());
-    if (m_isPresent)
+    if (m_battery.isPresent)
         service.addObject(batteryPath, deviceInterface, {}, deviceReaders());
     m_toldOfPower.reset(power());
     m_toldOfDisplay.reset(device());
@@ -99,30 +95,32 @@ void Power::attach(Service &service)
 
 State Power::state() const
 {
-    if (!m_isPresent)
+    if (!m_battery.isPresent)
         return UnknownState;
-    if (m_hasCharger)
-        return m_percentage < full ? Charging : FullyCharged;
-    return m_percentage > 0 ? Discharging : Empty;
+    if (m_battery.hasCharger)
+        return m_battery.percentage < full ? Charging : FullyCharged;
+    return m_battery.percentage > 0 ? Discharging : Empty;
 }
 
 Warning Power::warning() const
 {
-    if (!m_isPresent || m_hasCharger || m_percentage > low)
+    if (!m_battery.isPresent || m_battery.hasCharger || m_battery.percentage > low)
         return NoWarning;
-    if (m_percentage > critical)
+    if (m_battery.percentage > critical)
         return LowWarning;
-    return m_percentage > action ? CriticalWarning : ActionWarning;
+    return m_battery.percentage > action ? CriticalWarning : ActionWarning;
 }
 
 Properties Power::device() const
 {
     return {
-        {QStringLiteral("Type"), Variant(g_variant_new_uint32(m_isPresent ? BatteryType : UnknownType))},
-        {QStringLiteral("PowerSupply"), fromBool(m_isPresent)},
-        {QStringLiteral("IsPresent"), fromBool(m_isPresent)},
+        {QStringLiteral("Type"),
+         Variant(g_variant_new_uint32(m_battery.isPresent ? BatteryType : UnknownType))},
+        {QStringLiteral("PowerSupply"), fromBool(m_battery.isPresent)},
+        {QStringLiteral("IsPresent"), fromBool(m_battery.isPresent)},
         {QStringLiteral("State"), Variant(g_variant_new_uint32(state()))},
-        {QStringLiteral("Percentage"), Variant(g_variant_new_double(m_isPresent ? m_percentage : 0))},
+        {QStringLiteral("Percentage"),
+         Variant(g_variant_new_double(m_battery.isPresent ? m_battery.percentage : 0))},
         {QStringLiteral("WarningLevel"), Variant(g_variant_new_uint32(warning()))},
     };
 }
@@ -142,7 +140,7 @@ void Power::announce()
         return;
     announceChanges(*m_service, objectPath, powerInterface, &m_toldOfPower, power());
     announceChanges(*m_service, displayPath, deviceInterface, &m_toldOfDisplay, device());
-    if (m_isPresent)
+    if (m_battery.isPresent)
         announceChanges(*m_service, batteryPath, deviceInterface, &m_toldOfBattery, device());
 }
 
@@ -152,9 +150,9 @@ QString Power::setLevel(const QString &text)
     const double percentage = text.toDouble(&isNumber);
     if (!isNumber || !(percentage >= 0 && percentage <= full))
         throw Refusal(QStringLiteral("\"%1\" is no level; it is a number from 0 to 100").arg(text));
-    if (!m_isPresent)
+    if (!m_battery.isPresent)
         throw Refusal(QStringLiteral("The phone has no battery"));
-    m_percentage = percentage;
+    m_battery.percentage = percentage;
     announce();
     return QString();
 }
@@ -163,17 +161,14 @@ QString Power::setCharger(const QString &word)
 {
     if (word != QLatin1String("on") && word != QLatin1String("off"))
         throw Refusal(QStringLiteral("\"%1\" is neither on nor off").arg(word));
-    m_hasCharger = word == QLatin1String("on");
+    m_battery.hasCharger = word == QLatin1String("on");
     announce();
     return QString();
 }
 
 void Power::describe(QJsonObject &state) const
 {
-    state.insert(QStringLiteral("battery"),
-                 QJsonObject{{QStringLiteral("present"), m_isPresent},
-                             {QStringLiteral("percentage"), m_percentage},
-                             {QStringLiteral("charger"), m_hasCharger}});
+    state.insert(QStringLiteral("battery"), m_battery.describe());
 }
 
 std::vector<Action> Power::actions()
@@ -199,9 +194,7 @@ QString problemOf(const QJsonObject &)
 
 const ComponentRegistration registration({
     serviceName,
-    [](const QJsonObject &profile, Phone &) {
-        return std::make_unique<Power>(profile.value(QLatin1String("battery")).toObject());
-    },
+    [](const QJsonObject &, Phone &phone) { return std::make_unique<Power>(phone.battery); },
     problemOf,
 });
 

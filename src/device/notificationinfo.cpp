@@ -31,34 +31,20 @@ void registerTypes()
     qDBusRegisterMetaType<QList<NotificationData>>();
 }
 
-bool isMap(const QDBusArgument &argument)
-{
-    return argument.currentType() == QDBusArgument::MapType
-        && argument.currentSignature() == QLatin1String("a{sv}");
-}
+const QLatin1String mapSignature("a{sv}");
+const QLatin1String listSignature("av");
+const QLatin1String structureListSignature("a(v)");
 
-bool isListOfStructures(const QDBusArgument &argument)
+QVariantList listFrom(const QDBusArgument &argument, bool ofStructures = false)
 {
-    return argument.currentSignature() == QLatin1String("a(v)");
-}
-
-bool isList(const QDBusArgument &argument)
-{
-    return argument.currentType() == QDBusArgument::ArrayType
-        && (argument.currentSignature() == QLatin1String("av") || isListOfStructures(argument));
-}
-
-QVariantList listFrom(const QDBusArgument &argument)
-{
-    const bool hasStructures = isListOfStructures(argument);
     QVariantList list;
     argument.beginArray();
     while (!argument.atEnd()) {
         QDBusVariant element;
-        if (hasStructures)
+        if (ofStructures)
             argument.beginStructure();
         argument >> element;
-        if (hasStructures)
+        if (ofStructures)
             argument.endStructure();
         list.append(element.variant());
     }
@@ -102,15 +88,17 @@ bool expandValue(QVariant *value, int depth, const QString *key)
     if (value->userType() != qMetaTypeId<QDBusArgument>())
         return true;
     const auto argument = value->value<QDBusArgument>();
-    if (isMap(argument)) {
+    // Asked for once: it is written anew each time.
+    const QString signature = argument.currentSignature();
+    if (signature == mapSignature) {
         auto map = qdbus_cast<QVariantMap>(argument);
         if (!expandMap(&map, depth)) {
             warnOfMap(key);
             return false;
         }
         *value = map;
-    } else if (isList(argument)) {
-        QVariantList list = listFrom(argument);
+    } else if (signature == listSignature || signature == structureListSignature) {
+        QVariantList list = listFrom(argument, signature == structureListSignature);
         if (!expandList(&list, depth)) {
             warnOfList(key);
             return false;
