@@ -34,6 +34,10 @@ constexpr Comparison Comparisons[] = {
      "list/demarshal+copy/100000", 2},
     {"whole list, 100,000 rules / 10,000 rules", "list/library/100000", "list/library/10000", 12},
     {"one rule added to 10,000 / one copy of the list", "rule/library/10000", "rule/copy/10000", 4},
+    {"access point written / the same eight writes through raw QtDBus", "accesspoint/library",
+     "accesspoint/QtDBus", 0},
+    {"access point written / the same eight writes through sd-bus", "accesspoint/library",
+     "accesspoint/sd-bus", 0},
     {"loading the library / loading its dependencies", "load/library", "load/dependencies", 0},
 };
 
