@@ -6,6 +6,10 @@
 
 #include <corvanemdm/connectivitysettings.h>
 
+#include <connman/networkmanager.h>
+#include <connman/networkservice.h>
+#include <connman/networktechnology.h>
+
 #include <QtTest/QtTest>
 
 #include <memory>
@@ -33,9 +37,14 @@ private Q_SLOTS:
     void flightMode();
     void flightModeOutlivesTheDaemon();
     void daemonThatIsAway();
+    void clientsKnowTheWiredNetwork();
+    void clientsConfigureProxies();
+    void clientsFollowARestart();
 
 private:
     Phone m_phone;
+    NetworkService *wiredNetwork();
+
     std::unique_ptr<MessageLog> m_log;
 };
 
@@ -128,6 +137,66 @@ void RealConnmanTest::daemonThatIsAway()
     QVERIFY(seen.waitFor(2));
     QVERIFY(settings.flightModeEnabled());
     settings.setFlightModeEnabled(false);
+}
+
+/** As the clients of the connection manager list it. */
+NetworkService *RealConnmanTest::wiredNetwork()
+{
+    NetworkManager *manager = NetworkManagerFactory::createInstance();
+    const QString type = QStringLiteral("ethernet");
+    if (!waitUntil([&] { return manager->isValid() && manager->getSavedServices(type).size() == 1; }))
+        qFatal("The real ConnMan has no wired network");
+    return manager->getSavedServices(type).constFirst();
+}
+
+void RealConnmanTest::clientsKnowTheWiredNetwork()
+{
+    const NetworkService *network = wiredNetwork();
+    QVERIFY(network->path().startsWith(QLatin1String("/net/connman/service/ethernet_")));
+    QCOMPARE(network->name(), QStringLiteral("Wired"));
+    QCOMPARE(network->type(), QStringLiteral("ethernet"));
+    QVERIFY(network->saved());
+    const NetworkTechnology *technology
+        = NetworkManagerFactory::createInstance()->getTechnology(QStringLiteral("ethernet"));
+    QVERIFY(technology);
+    QCOMPARE(technology->name(), QStringLiteral("Wired"));
+    QVERIFY(technology->powered());
+}
+
+void RealConnmanTest::clientsConfigureProxies()
+{
+    NetworkService *network = wiredNetwork();
+    const QString method = QStringLiteral("Method");
+    const QVariantMap manual{
+        {method, QStringLiteral("manual")},
+        {QStringLiteral("Servers"),
+         QStringList{QStringLiteral("proxy.example:8080"), QStringLiteral("10.0.0.1:3128")}},
+        {QStringLiteral("Excludes"), QStringList{QStringLiteral("intranet.example")}}};
+    const QVariantMap automatic{{method, QStringLiteral("auto")},
+                                {QStringLiteral("URL"), QStringLiteral("http://pac.example/proxy.pac")}};
+    const QVariantMap direct{{method, QStringLiteral("direct")}};
+    for (const QVariantMap &configuration : {manual, automatic, direct}) {
+        network->setProxyConfig(configuration);
+        QVERIFY(waitUntil([&] { return network->proxyConfig() == configuration; }));
+        // Another client reads the same anew.
+        NetworkService other;
+        QSignalSpy read(&other, &NetworkService::propertiesReady);
+        other.setPath(network->path());
+        QVERIFY(waitUntil([&] { return !read.isEmpty() || other.proxyConfig() == configuration; }));
+        QCOMPARE(other.proxyConfig(), configuration);
+    }
+}
+
+void RealConnmanTest::clientsFollowARestart()
+{
+    const QString path = wiredNetwork()->path();
+    NetworkManager *manager = NetworkManagerFactory::createInstance();
+    m_phone.stopService(Connman);
+    QVERIFY(waitUntil([manager] { return !manager->isAvailable(); }));
+    QVERIFY(manager->getTechnologies().isEmpty());
+    m_phone.startService(Connman);
+    QCOMPARE(wiredNetwork()->path(), path);
+    QVERIFY(manager->getTechnology(QStringLiteral("ethernet")));
 }
 
 QTEST_GUILESS_MAIN(RealConnmanTest)
