@@ -17,6 +17,7 @@ struct Service {
     QString description; ///< for people
 
     static Service telephony();
+    static Service connectionManager();
     static Service mdmProxy();
 
     /** "the telephony service (org.ofono)" */

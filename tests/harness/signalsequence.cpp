@@ -4,10 +4,14 @@
 #include "waiting.h"
 
 #include <corvanemdm/callstatistics.h>
+#include <corvanemdm/networkdatacounter.h>
 #include <corvanemdm/simfilter.h>
 #include <corvanemdm/siminfo.h>
 
+#include <QtCore/QUrl>
+
 using Corvane::Mdm::CallStatistics;
+using Corvane::Mdm::NetworkDataCounter;
 using Corvane::Mdm::SimFilter;
 using Corvane::Mdm::SimInfo;
 
@@ -23,6 +27,21 @@ QString text(const SimFilter::Rule &rule)
 QString text(const CallStatistics::Result &result)
 {
     return result.time.toString(Qt::ISODate) + QLatin1Char('=') + QString::number(result.value);
+}
+
+QString text(const NetworkDataCounter::Update &update)
+{
+    static const char *const types[] = {"home", "roaming", "wlan"};
+    return QStringLiteral("%1 %2 tx:%3 rx:%4 time:%5")
+        .arg(update.identifier, QLatin1String(types[update.type]))
+        .arg(update.txBytes)
+        .arg(update.rxBytes)
+        .arg(update.time);
+}
+
+QString text(const QUrl &url)
+{
+    return url.toString();
 }
 
 template <typename T> QString text(const QList<T> &list)
@@ -62,6 +81,10 @@ QString text(int type, const void *value)
         return text(*static_cast<const QList<CallStatistics::Result> *>(value));
     if (type == qMetaTypeId<SimInfo::SimState>())
         return simStateText(*static_cast<const SimInfo::SimState *>(value));
+    if (type == qMetaTypeId<NetworkDataCounter::Update>())
+        return text(*static_cast<const NetworkDataCounter::Update *>(value));
+    if (type == qMetaTypeId<QList<QUrl>>())
+        return text(*static_cast<const QList<QUrl> *>(value));
     if (type == QMetaType::UnknownType)
         return QStringLiteral("<type unknown to the meta-object system>");
     return text(QVariant(type, value));

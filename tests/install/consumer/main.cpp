@@ -5,6 +5,8 @@
 #include <corvanemdm/connectivitysettings.h>
 #include <corvanemdm/corvanemdm_global.h>
 #include <corvanemdm/locationinfo.h>
+#include <corvanemdm/netproxy.h>
+#include <corvanemdm/networkdatacounter.h>
 #include <corvanemdm/notificationinfo.h>
 #include <corvanemdm/simfilter.h>
 #include <corvanemdm/siminfo.h>
@@ -112,6 +114,25 @@ bool locationInfoWorks()
     return info.satellitesInUse() == -1 && !position.timestamp.isValid() && position.latitude == 0.0;
 }
 
+bool netProxyWorks()
+{
+    NetProxy proxy;
+    QObject::connect(&proxy, &NetProxy::validChanged, &proxy, [](bool) {});
+    // Nothing is selected before the event loop has run.
+    return !proxy.isValid() && proxy.type() == NetProxy::Invalid && !proxy.setType(NetProxy::Direct)
+        && proxy.getIdentifiers(QStringLiteral("global")) == QStringList(QStringLiteral("global"));
+}
+
+bool networkDataCounterWorks()
+{
+    NetworkDataCounter counter;
+    int updates = 0;
+    QObject::connect(&counter, &NetworkDataCounter::counterUpdate, &counter,
+                     [&updates](const NetworkDataCounter::Update &) { ++updates; });
+    counter.setUpdateInterval(5);
+    return !counter.active() && counter.updateInterval() == 5 && updates == 0;
+}
+
 QString latestVersion()
 {
     const SoftwareUpdate update;
@@ -127,7 +148,7 @@ int main(int argc, char **argv)
     QCoreApplication application(argc, argv);
     const bool works = simFilterWorks() && simVoiceCallFilterWorks() && otherFiltersWork() && simInfoWorks()
         && connectivitySettingsWork() && callStatisticsWork() && applicationsWork() && notificationInfoWorks()
-        && locationInfoWorks();
+        && locationInfoWorks() && netProxyWorks() && networkDataCounterWorks();
     QTextStream(stdout) << (works ? "consumer works" : "consumer fails") << ", update: " << latestVersion()
                         << '\n';
     return works ? 0 : 1;
