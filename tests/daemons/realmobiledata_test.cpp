@@ -151,11 +151,14 @@ void RealMobileDataTest::radioTechnologies()
     QCOMPARE(settings.supportedCellularTechnologies(Modem),
              (QVector<Technologies>{Technologies(1), Technologies(3), Technologies(7)}));
     QCOMPARE(int(settings.selectedCellularTechnologies(Modem)), 0);
-    // The driver for emulated modems leaves the setting out, which oFono tells in its own words.
-    QVERIFY(!settings.selectCellularTechnologies(Modem, Technologies(3)));
-    QCOMPARE(m_log->takeWarnings().join(QLatin1Char('\n')),
-             QStringLiteral("Unable to set the preferred radio technology: \"Implementation not provided\""));
-    QCOMPARE(int(settings.selectedCellularTechnologies(Modem)), 0);
+    for (const int technologies : {1, 3, 7, 0}) {
+        QVERIFY(settings.selectCellularTechnologies(Modem, Technologies(technologies)));
+        QCOMPARE(int(settings.selectedCellularTechnologies(Modem)), technologies);
+    }
+    QCOMPARE(OfonoBus::properties("/ril_0", "org.ofono.RadioSettings")
+                 .value(QStringLiteral("TechnologyPreference"))
+                 .toString(),
+             QStringLiteral("any"));
 }
 
 void RealMobileDataTest::accessPoints()
