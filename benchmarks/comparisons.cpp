@@ -43,6 +43,10 @@ constexpr Comparison Comparisons[] = {
     {"10,000 packages / the loop over librpm alone", "packages/library", "packages/librpm", 0},
     {"500 applications / rpm -qf of their files in one process", "applications/library", "applications/rpm",
      1},
+    {"access point written / the same eight writes through raw QtDBus", "accesspoint/library",
+     "accesspoint/QtDBus", 0},
+    {"access point written / the same eight writes through sd-bus", "accesspoint/library",
+     "accesspoint/sd-bus", 0},
     {"loading the library / loading its dependencies", "load/library", "load/dependencies", 0},
 };
 

@@ -35,7 +35,8 @@ RealDaemon stockOfono(const QString &name)
 RealDaemon ofonoWithOurPlugin()
 {
     RealDaemon ofono = stockOfono(QStringLiteral("ofono"));
-    ofono.additions = {{"/usr/lib/ofono/plugins/veldmobile.so", "../lib/ofono/plugins/veldmobile.so"}};
+    ofono.additions = {{"/usr/lib/ofono/plugins/veldmobile.so", "../lib/ofono/plugins/veldmobile.so"},
+                       {"/usr/lib/ofono/plugins/emulatedradio.so", "../lib/corvanemdm/emulatedradio.so"}};
     return ofono;
 }
 

@@ -7,6 +7,7 @@
 #include <corvanemdm/connectivitysettings.h>
 
 #include <QtCore/QJsonArray>
+#include <QtCore/QProcess>
 #include <QtDBus/QDBusArgument>
 #include <QtDBus/QDBusMetaType>
 #include <QtDBus/QDBusObjectPath>
@@ -214,6 +215,7 @@ private Q_SLOTS:
     void connectsAndDisconnects();
     void switchingThatFails_data();
     void switchingThatFails();
+    void serviceThatVanishesDuringACall();
     void writesTheInternetAccessPoint_data();
     void writesTheInternetAccessPoint();
     void writesAnMmsAccessPointWhileConnected();
@@ -1135,6 +1137,29 @@ void ConnectivitySettingsTest::switchingThatFails()
                             : QStringLiteral("Already disconnected from network via IMSI: "
                                              "\"244051234567890\"");
     QCOMPARE(m_log->takeInfos(), informs ? QStringList(info) : QStringList());
+}
+
+void ConnectivitySettingsTest::serviceThatVanishesDuringACall()
+{
+    // The call blocks this process, so that another one takes the service away, once the call has arrived.
+    QProcess other;
+    other.start(QStringLiteral("sh"),
+                {QStringLiteral("-c"),
+                 QStringLiteral("corvane-simctl fault never net.connman Connect --times 1 && "
+                                "while corvane-simctl faults | grep -q never; do :; done && "
+                                "corvane-simctl stop net.connman")});
+    QVERIFY(other.waitForReadyRead());
+    ConnectivitySettings settings;
+    QVERIFY(!settings.connectToMobileNetwork(FirstImsi));
+    QVERIFY(other.waitForFinished());
+    QCOMPARE(other.exitCode(), 0);
+    const QStringList warnings = m_log->takeWarnings();
+    QCOMPARE(warnings.size(), 1);
+    QVERIFY2(
+        warnings.first().startsWith(QLatin1String("Unable to connect: \"Message recipient disconnected")),
+        qPrintable(warnings.first()));
+    QVERIFY(!settings.connectToMobileNetwork(FirstImsi));
+    QCOMPARE(m_log->takeWarnings(), texts({"Unable to read network services"}));
 }
 
 void ConnectivitySettingsTest::writesTheInternetAccessPoint_data()

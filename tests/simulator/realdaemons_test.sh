@@ -28,6 +28,30 @@ contains "services" "$services" "org.corvaneos.mdmproxy running"
 contains "services" "$services" "org.ofono running"
 expect "its log" "$("$simulator" --real ofono -- grep -c 'oFono version' /run/corvane-simulator/ofono.log)" 1
 
+# ConnMan alone, and on the modems of the real oFono.
+networks=$("$simulator" --real connman -- timeout 60 bash -c '
+    networks() { gdbus call --system -d net.connman -o / -m net.connman.Manager.GetServices; }
+    networks
+    corvane-simctl act cable unplug eth0
+    while [[ $(networks) == *_cable* ]]; do :; done
+    corvane-simctl act cable plug eth0
+    until [[ $(networks) == *_cable*ready* ]]; do :; done
+    corvane-simctl act cable plug eth7' 2>&1) || true
+contains "networks of the real ConnMan" "$networks" "_cable', {'Type': <'ethernet'>"
+contains "a cable that is not there" "$networks" 'There is no cable at "eth7"; there are eth0, dummy0'
+services=$("$simulator" --real ofono,connman -- corvane-simctl services | tr -s ' ')
+contains "services" "$services" "org.ofono running"
+contains "services" "$services" "net.connman running"
+expect "cables" "$("$simulator" --real connman -- corvane-simctl state cables | tr -s ' ')" \
+    "cables[0].interface eth0
+cables[0].plugged true
+cables[1].interface dummy0
+cables[1].plugged true"
+status=0
+text=$("$simulator" --real ofono,stock-ofono true 2>&1) || status=$?
+expect "status with one service twice" $status 2
+contains "message" "$text" "ofono and stock-ofono are one and the same service"
+
 # A daemon that dies by itself is told of, can be started again, and is not forgotten.
 status=0
 # shellcheck disable=SC2016
@@ -52,5 +76,9 @@ if [[ $EUID -eq 0 ]]; then
     text=$("$simulator" -- sh -c 'ln -sf /bin/false /usr/sbin/ofonod && exec "$0" --real ofono true' "$simulator" 2>&1) || status=$?
     expect "status with a daemon that ends" $status 125
     contains "message" "$text" "corvane-simulator: /usr/sbin/ofonod ended with status 1"
+    status=0
+    text=$("$simulator" -- sh -c 'rm /usr/sbin/dnsmasq && exec "$0" --real connman true' "$simulator" 2>&1) || status=$?
+    expect "status without the address server" $status 125
+    contains "message" "$text" "/usr/sbin/dnsmasq is not there; install Debian's package dnsmasq-base"
 fi
 [[ $failures -eq 0 ]]

@@ -332,6 +332,10 @@ refusals_help() {
     refusal 2 'wrong.json: /sims/1/imsi: ' --device wrong.json true
     profile '{"sims": [{"provider": "None"}]}'
     refusal 2 'wrong.json: /sims/0: ' --device wrong.json true
+    profile '{"sims": [{"imsi": "244051", "technologies": ["gsm"], "technologyPreference": "lte"}]}'
+    refusal 2 'wrong.json: /sims/0/technologyPreference: the slot'"'"'s technologies are without lte' --device wrong.json true
+    profile '{"sims": [{"imsi": "244051", "accessPoints": [{"type": "internet"}, {"type": "other"}]}]}'
+    refusal 2 'wrong.json: /sims/0/accessPoints/1/type: .*"mms"' --device wrong.json true
     profile '{"softwareUpdate": {"catalogue": [{"version": "1.0"}, {"version": "1.0"}]}}'
     refusal 2 'wrong.json: /softwareUpdate/catalogue/1/version: ' --device wrong.json true
     profile '{"name": 1'
