@@ -17,6 +17,8 @@ Command smsCommand();
 Command dataCommand();
 Command callStatisticsCommand();
 Command simCommand();
+Command proxyCommand();
+Command countersCommand();
 Command policyCommand();
 
 // Options that commands share.

@@ -257,7 +257,7 @@ void MdmctlPolicyTest::wrongPolicyIsRefusedWithThePath_data()
     QTest::newRow("unknown family")
         << QByteArray(R"({"call": {}})")
         << R"(FILE: /call: unknown member; must be one of "$schema", "calls", "data", )"
-           R"("description", "name", "sms", "softwareUpdate")";
+           R"("description", "name", "proxy", "sms", "softwareUpdate")";
     QTest::newRow("unknown member")
         << QByteArray(R"({"calls": {"dail": {}}})")
         << R"(FILE: /calls/dail: unknown member; must be one of "dial", "incoming")";
