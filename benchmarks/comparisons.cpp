@@ -34,6 +34,13 @@ constexpr Comparison Comparisons[] = {
      "list/demarshal+copy/100000", 2},
     {"whole list, 100,000 rules / 10,000 rules", "list/library/100000", "list/library/10000", 12},
     {"one rule added to 10,000 / one copy of the list", "rule/library/10000", "rule/copy/10000", 4},
+    {"proxy of 1 of 10 networks selected / walking their list", "selectproxy/library/10",
+     "selectproxy/walk/10", 0},
+    {"proxy of 1 of 100 networks selected / walking their list", "selectproxy/library/100",
+     "selectproxy/walk/100", 0},
+    {"proxy of 1 of 1,000 networks selected / walking their list", "selectproxy/library/1000",
+     "selectproxy/walk/1000", 0},
+    {"1,000 reports on data / reading their numbers", "usage/library/1000", "usage/numbers/1000", 0},
     {"loading the library / loading its dependencies", "load/library", "load/dependencies", 0},
 };
 

@@ -1,4 +1,5 @@
 // SPDX-License-Identifier: LGPL-2.1-or-later
+#include "endurance.h"
 #include "phone.h"
 #include "signalsequence.h"
 #include "waiting.h"
@@ -9,7 +10,6 @@
 #include <corvanemdm/simvoicecallfilter.h>
 
 #include <QtCore/QElapsedTimer>
-#include <QtCore/QFile>
 #include <QtCore/QRandomGenerator>
 #include <QtTest/QtTest>
 
@@ -38,23 +38,6 @@ QStringList stateTexts(const SimInfo &info)
     for (const SimInfo::SimState &state : states)
         result.append(simStateText(state));
     return result;
-}
-
-/** Memory of this process that is in use, in KiB. */
-qint64 residentMemory()
-{
-    QFile status(QStringLiteral("/proc/self/statm"));
-    if (!status.open(QIODevice::ReadOnly))
-        return 0;
-    return status.readAll().split(' ').value(1).toLongLong() * 4;
-}
-
-void runFor(int microseconds)
-{
-    QElapsedTimer elapsed;
-    elapsed.start();
-    while (elapsed.nsecsElapsed() < qint64(microseconds) * 1000)
-        QCoreApplication::processEvents();
 }
 
 /** Whether both slots have come to their states; before that the ones of the run before are kept. */
