@@ -139,7 +139,7 @@ void MdmctlProxyTest::showsOne()
     QCOMPARE(run("proxy show").output, QStringLiteral("Global Proxy: manual: http://a:1, but not x, y\n"));
     QCOMPARE(run("proxy show --json").json(),
              json(R"({"identifier": "global", "name": "Global Proxy", "used": true, "method": "manual",
-                      "servers": ["http://a:1"], "exclusions": ["x", "y"]})"));
+                      "servers": ["http:\/\/a:1"], "exclusions": ["x", "y"]})"));
     QCOMPARE(run("proxy show Home").output, QStringLiteral("Home: direct (not used)\n"));
 }
 
@@ -166,15 +166,15 @@ void MdmctlProxyTest::configures()
     QCOMPARE(result.status, 0);
     QVERIFY(
         result.output.contains(QStringLiteral(": manual: http://a:1, http://b:2, but not localhost, .x")));
-    QCOMPARE(state(), json(R"({"method": "manual", "servers": ["http://a:1", "http://b:2"],
+    QCOMPARE(state(), json(R"({"method": "manual", "servers": ["http:\/\/a:1", "http:\/\/b:2"],
                                "excludes": ["localhost", ".x"]})"));
     // From manual to manual, servers and exclusions at once.
     QCOMPARE(configure("manual", " http://c:3").status, 0);
-    QCOMPARE(state(), json(R"({"method": "manual", "servers": ["http://c:3"]})"));
+    QCOMPARE(state(), json(R"({"method": "manual", "servers": ["http:\/\/c:3"]})"));
     QCOMPARE(configure("automatic", " http://pac/x").status, 0);
-    QCOMPARE(state(), json(R"({"method": "auto", "url": "http://pac/x"})"));
+    QCOMPARE(state(), json(R"({"method": "auto", "url": "http:\/\/pac/x"})"));
     QCOMPARE(configure("automatic", " http://pac/y").status, 0);
-    QCOMPARE(state(), json(R"({"method": "auto", "url": "http://pac/y"})"));
+    QCOMPARE(state(), json(R"({"method": "auto", "url": "http:\/\/pac/y"})"));
     result = configure("direct", " --json");
     QCOMPARE(result.json().value(QLatin1String("method")).toString(), QStringLiteral("direct"));
     QCOMPARE(state(), json(R"({"method": "direct"})"));
@@ -190,7 +190,7 @@ void MdmctlProxyTest::networkByItsName()
                           QStringLiteral("Corvane Office"), QStringLiteral("http://pac")})
                  .output,
              QStringLiteral("Corvane Office: automatic: http://pac\n"));
-    QCOMPARE(proxyOf(Office), json(R"({"method": "auto", "url": "http://pac"})"));
+    QCOMPARE(proxyOf(Office), json(R"({"method": "auto", "url": "http:\/\/pac"})"));
 }
 
 void MdmctlProxyTest::ambiguousNameIsRefused()
@@ -311,8 +311,8 @@ void MdmctlProxyTest::absentServiceIsTold()
 void MdmctlProxyTest::policyIsApplied()
 {
     const QString policy = write(R"({"proxy": {"use": "global",
-        "global": {"method": "manual", "servers": ["http://a:1"], "exclusions": ["localhost"]},
-        "networks": {"Home": {"method": "automatic", "url": "http://pac"}}}})");
+        "global": {"method": "manual", "servers": ["http:\/\/a:1"], "exclusions": ["localhost"]},
+        "networks": {"Home": {"method": "automatic", "url": "http:\/\/pac"}}}})");
     QJsonArray settings
         = Mdmctl::run({QStringLiteral("policy"), QStringLiteral("check"), policy, QStringLiteral("--json")})
               .json()
@@ -321,7 +321,7 @@ void MdmctlProxyTest::policyIsApplied()
     QCOMPARE(settings.size(), 3);
     QCOMPARE(settings.at(0).toObject(),
              json(R"({"path": "proxy.global", "status": "different", "present": {"method": "direct"},
-                      "wanted": {"method": "manual", "servers": ["http://a:1"], "exclusions": ["localhost"]},
+                      "wanted": {"method": "manual", "servers": ["http:\/\/a:1"], "exclusions": ["localhost"]},
                       "detail": ""})"));
     const Mdmctl::Result applied
         = Mdmctl::run({QStringLiteral("policy"), QStringLiteral("apply"), policy, QStringLiteral("--json")});
@@ -330,8 +330,8 @@ void MdmctlProxyTest::policyIsApplied()
     for (const QJsonValue &setting : qAsConst(settings))
         QCOMPARE(setting[QLatin1String("status")].toString(), QStringLiteral("changed"));
     QCOMPARE(globalProxy(), json(R"({"active": true, "configuration": {"method": "manual",
-                                     "servers": ["http://a:1"], "excludes": ["localhost"]}})"));
-    QCOMPARE(proxyOf(Home), json(R"({"method": "auto", "url": "http://pac"})"));
+                                     "servers": ["http:\/\/a:1"], "excludes": ["localhost"]}})"));
+    QCOMPARE(proxyOf(Home), json(R"({"method": "auto", "url": "http:\/\/pac"})"));
     // Applying again changes nothing.
     m_phone.takeJournal(Service);
     QCOMPARE(Mdmctl::run({QStringLiteral("policy"), QStringLiteral("apply"), policy}).status, 0);
@@ -359,7 +359,7 @@ void MdmctlProxyTest::wrongPolicyIsRefused_data()
         << QByteArray(R"({"networks": {"a/b": {"method": "automatic"}}})")
         << "/proxy/networks/a~1b: an automatic proxy needs \"url\"";
     QTest::newRow("no URL")
-        << QByteArray(R"({"global": {"method": "manual", "servers": ["http://a", "b:1"]}})")
+        << QByteArray(R"({"global": {"method": "manual", "servers": ["http:\/\/a", "b:1"]}})")
         << "/proxy/global/servers/1: must be a URL, such as http://proxy.example:3128; is "
            "\"b:1\"";
     QTest::newRow("no URL of a script")
@@ -383,14 +383,15 @@ void MdmctlProxyTest::wrongPolicyIsRefused()
 
 void MdmctlProxyTest::watchPutsDriftRight()
 {
-    Mdmctl watch({QStringLiteral("policy"), QStringLiteral("watch"),
-                  write(R"({"proxy": {"use": "global", "global": {"method": "automatic", "url": "http://pac"},
+    Mdmctl watch(
+        {QStringLiteral("policy"), QStringLiteral("watch"),
+         write(R"({"proxy": {"use": "global", "global": {"method": "automatic", "url": "http:\/\/pac"},
                             "networks": {"Home": {"method": "direct"}}}})")});
     QVERIFY(watch.waitForOutput(QStringLiteral("Watching for drift")));
     act("proxy configure", {QStringLiteral("direct")});
     QVERIFY(waitUntil([this] {
         return globalProxy().value(QLatin1String("configuration")).toObject()
-            == json(R"({"method": "auto", "url": "http://pac"})");
+            == json(R"({"method": "auto", "url": "http:\/\/pac"})");
     }));
     act("proxy active", {QStringLiteral("off")});
     QVERIFY(waitUntil([this] { return globalProxy().value(QLatin1String("active")).toBool(); }));
@@ -418,7 +419,7 @@ void MdmctlProxyTest::exportCanBeApplied()
     QCOMPARE(proxy.value(QLatin1String("global")).toObject(), json(R"({"method": "direct"})"));
     const QJsonObject networks = proxy.value(QLatin1String("networks")).toObject();
     QCOMPARE(networks.value(Home).toObject(),
-             json(R"({"method": "manual", "servers": ["http://a:1"], "exclusions": ["x"]})"));
+             json(R"({"method": "manual", "servers": ["http:\/\/a:1"], "exclusions": ["x"]})"));
     QVERIFY(!networks.contains(Office));
     QCOMPARE(Mdmctl::run({QStringLiteral("policy"), QStringLiteral("check"), write(exported.output.toUtf8())})
                  .status,

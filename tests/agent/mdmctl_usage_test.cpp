@@ -105,7 +105,7 @@ void MdmctlUsageTest::mistakesAreToldInOneLine_data()
     };
     row("",
         R"("mdmctl" needs a command: must be one of "update", "calls", "sms", "data", "sim", )"
-        R"("call-statistics", "policy", "completion")");
+        R"("call-statistics", "proxy", "counters", "policy", "completion")");
     row("calls --json",
         R"("mdmctl calls" needs a command: must be one of "show", "add", "remove", "set", "clear", )"
         R"("default", "watch")");
@@ -166,9 +166,9 @@ void MdmctlUsageTest::bashCompletes_data()
         QTest::newRow(line) << QString::fromUtf8(expected);
     };
     // A line that ends with a space has an empty word at the cursor.
-    row("mdmctl ", "update calls sms data sim call-statistics policy completion");
+    row("mdmctl ", "update calls sms data sim call-statistics proxy counters policy completion");
     row("mdmctl sim ", "list watch imei imsi iccid numbers");
-    row("mdmctl p", "policy");
+    row("mdmctl po", "policy");
     row("mdmctl calls ", "show add remove set clear default watch");
     row("mdmctl calls add ", "dial incoming");
     row("mdmctl calls add dial 24405 ", "block allow hangup");
