@@ -47,6 +47,13 @@ constexpr Comparison Comparisons[] = {
      "accesspoint/QtDBus", 0},
     {"access point written / the same eight writes through sd-bus", "accesspoint/library",
      "accesspoint/sd-bus", 0},
+    {"proxy of 1 of 10 networks selected / walking their list", "selectproxy/library/10",
+     "selectproxy/walk/10", 0},
+    {"proxy of 1 of 100 networks selected / walking their list", "selectproxy/library/100",
+     "selectproxy/walk/100", 0},
+    {"proxy of 1 of 1,000 networks selected / walking their list", "selectproxy/library/1000",
+     "selectproxy/walk/1000", 0},
+    {"1,000 reports on data / reading their numbers", "usage/library/1000", "usage/numbers/1000", 0},
     {"loading the library / loading its dependencies", "load/library", "load/dependencies", 0},
 };
 

@@ -25,6 +25,8 @@ Command installCommand();
 Command removeCommand();
 Command wifiCommand();
 Command flightModeCommand();
+Command proxyCommand();
+Command countersCommand();
 Command policyCommand();
 
 // Options that commands share.

@@ -215,15 +215,20 @@ Reply ProxySection::change(const Setting &setting)
 
 QJsonObject ProxySection::exported()
 {
-    QJsonObject exported{{useMember, m_proxies->usesGlobal() ? globalMember : networksMember}};
-    if (m_proxies->select(Proxies::global()).isDone())
-        exported.insert(globalMember, m_proxies->configuration().toJson());
+    QJsonObject exported{{useMember, QString(m_proxies->usesGlobal() ? globalMember : networksMember)}};
+    // What no policy may ask for stays out, such as a script that the network finds by itself.
+    const auto insert = [this](QJsonObject *members, const QString &name, const QString &identifier) {
+        if (!m_proxies->select(identifier).isDone())
+            return;
+        const QJsonObject configuration = m_proxies->configuration().toJson();
+        if (faultOf(configuration, {}).isEmpty())
+            members->insert(name, configuration);
+    };
+    insert(&exported, globalMember, Proxies::global());
     QJsonObject networks;
     const QStringList identifiers = m_proxies->networks();
-    for (const QString &identifier : identifiers) {
-        if (m_proxies->select(identifier).isDone())
-            networks.insert(identifier, m_proxies->configuration().toJson());
-    }
+    for (const QString &identifier : identifiers)
+        insert(&networks, identifier, identifier);
     if (!networks.isEmpty())
         exported.insert(networksMember, networks);
     return exported;

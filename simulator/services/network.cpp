@@ -257,24 +257,29 @@ void Network::step(const QString &state)
     setState(state);
     if (state == readyState) {
         m_isSaved = true;
+        // Who is answered has been told.
+        m_surroundings.changed();
         finishAttempt(nullptr);
-    } else {
-        m_timer.start(m_surroundings.stepMilliseconds, [this, state] {
-            const bool mustFail = state == associationState && m_nextError.isEmpty() && m_type == cellularType
-                && !m_surroundings.links.activate(m_contextPath, true);
-            const QString error
-                = mustFail ? QStringLiteral("connect-failed") : std::exchange(m_nextError, QString());
-            if (error.isEmpty()) {
-                step(state == associationState ? configurationState : readyState);
-                return;
-            }
-            m_error = error;
-            setState(failureState);
-            const MethodError failed = ConnMan::error("Failed", "Input/output error");
-            finishAttempt(&failed);
-        });
+        return;
     }
+    m_timer.start(m_surroundings.stepMilliseconds, [this, state] {
+        const bool mustFail = state == associationState && m_nextError.isEmpty() && m_type == cellularType
+            && !m_surroundings.links.activate(m_contextPath, true);
+        m_error = mustFail ? QStringLiteral("connect-failed") : std::exchange(m_nextError, QString());
+        if (m_error.isEmpty())
+            step(state == associationState ? configurationState : readyState);
+        else
+            fail();
+    });
     m_surroundings.changed();
+}
+
+void Network::fail()
+{
+    setState(failureState);
+    m_surroundings.changed();
+    const MethodError failed = ConnMan::error("Failed", "Input/output error");
+    finishAttempt(&failed);
 }
 
 /** Answers those who have asked for the connection. */

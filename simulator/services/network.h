@@ -94,6 +94,7 @@ public:
 private:
     void setState(const QString &state);
     void step(const QString &state);
+    void fail();
     void finishAttempt(const MethodError *error);
     void takeDown();
     void end(const QString &state);

@@ -1,4 +1,5 @@
 // SPDX-License-Identifier: LGPL-2.1-or-later
+#include "endurance.h"
 #include "phone.h"
 #include "servicerestarts.h"
 #include "signalsequence.h"

@@ -2,26 +2,14 @@
 #ifndef CORVANE_TEST_ENDURANCE_H
 #define CORVANE_TEST_ENDURANCE_H
 
-#include <QtCore/QCoreApplication>
-#include <QtCore/QElapsedTimer>
-#include <QtCore/QFile>
+#include <QtCore/QtGlobal>
+
+// What tests that do something very often look at.
 
 /** Memory of this process that is in use, in KiB. */
-inline qint64 residentMemory()
-{
-    QFile status(QStringLiteral("/proc/self/statm"));
-    if (!status.open(QIODevice::ReadOnly))
-        return 0;
-    return status.readAll().split(' ').value(1).toLongLong() * 4;
-}
+qint64 residentMemory();
 
-/** Lets the event loop run, to get to a moment that nobody chose. */
-inline void runFor(int microseconds)
-{
-    QElapsedTimer elapsed;
-    elapsed.start();
-    while (elapsed.nsecsElapsed() < qint64(microseconds) * 1000)
-        QCoreApplication::processEvents();
-}
+/** Runs the event loop for as long as that, whatever happens, and once at least. */
+void runFor(int microseconds);
 
 #endif // CORVANE_TEST_ENDURANCE_H

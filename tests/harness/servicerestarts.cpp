@@ -1,9 +1,7 @@
 // SPDX-License-Identifier: LGPL-2.1-or-later
 #include "servicerestarts.h"
 
-#include <QtCore/QCoreApplication>
-#include <QtCore/QElapsedTimer>
-#include <QtCore/QFile>
+#include "endurance.h"
 
 namespace
 {
@@ -16,15 +14,6 @@ int numberFromEnvironment(const char *name, int usual)
     bool isNumber = false;
     const int number = qEnvironmentVariableIntValue(name, &isNumber);
     return isNumber ? number : usual;
-}
-
-/** Memory of this process that is in use, in KiB. */
-qint64 residentMemory()
-{
-    QFile status(QStringLiteral("/proc/self/statm"));
-    if (!status.open(QIODevice::ReadOnly))
-        return 0;
-    return status.readAll().split(' ').value(1).toLongLong() * 4;
 }
 
 } // namespace
@@ -76,11 +65,5 @@ QString ServiceRestarts::summary() const
 
 void ServiceRestarts::passTime(int mostMicroseconds)
 {
-    const qint64 nanoseconds = qint64(m_random.bounded(mostMicroseconds)) * 1000;
-    QElapsedTimer elapsed;
-    elapsed.start();
-    // Once at least: what came before the service had stopped is here already.
-    do {
-        QCoreApplication::processEvents();
-    } while (elapsed.nsecsElapsed() < nanoseconds);
+    runFor(m_random.bounded(mostMicroseconds));
 }

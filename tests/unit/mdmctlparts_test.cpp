@@ -1,4 +1,5 @@
 // SPDX-License-Identifier: LGPL-2.1-or-later
+#include <livetable.h>
 #include <progress.h>
 #include <suggestion.h>
 #include <table.h>
@@ -19,7 +20,16 @@ private Q_SLOTS:
     void tableWithoutEmptyColumns();
     void barFitsTheWidth_data();
     void barFitsTheWidth();
+    void liveTableIsReplacedInPlace();
 };
+
+void MdmctlPartsTest::liveTableIsReplacedInPlace()
+{
+    const QString two = QStringLiteral("a\nb");
+    QCOMPARE(LiveTable::replacement(QString(), two), QStringLiteral("a\nb\n"));
+    QCOMPARE(LiveTable::replacement(two, QStringLiteral("c")), QStringLiteral("\x1b[2A\x1b[Jc\n"));
+    QCOMPARE(LiveTable::replacement(QStringLiteral("c"), two), QStringLiteral("\x1b[1A\x1b[Ja\nb\n"));
+}
 
 void MdmctlPartsTest::suggestions_data()
 {
