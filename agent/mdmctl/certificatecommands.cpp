@@ -159,6 +159,11 @@ Run runPut(bool trusted)
     return [trusted](TrustStore &store, const Values &values) -> int {
         constexpr qint64 largest = 4 * 1024 * 1024;
         const QString source = values.first(fileArgument);
+        if (source == QLatin1String("-") && !values.has(nameName)) {
+            printError(QStringLiteral("standard input has no name for the phone: give it one with ")
+                       + nameName);
+            return ExitUsage;
+        }
         const QString name = values.has(nameName) ? values.first(nameName) : certificateFileName(source);
         const QString fault = certificateFileNameFault(name);
         if (!fault.isEmpty()) {

@@ -500,6 +500,9 @@ void MdmctlPolicyTest::exportIsWhatCheckAccepts()
     QCOMPARE(exported.status, 0);
     QJsonObject policy = exported.json();
     QVERIFY(policy.take(QStringLiteral("name")).toString().startsWith(QStringLiteral("Exported from ")));
+    // Tests of their own look at these.
+    for (const char *other : {"accounts", "certificates", "autostart"})
+        QVERIFY(!policy.take(QLatin1String(other)).toObject().isEmpty());
     QCOMPARE(policy,
              json(R"({"calls": {"dial": {"default": "allow", "rules": [{"imsi": "1", "action": "block"}]},
                                         "incoming": {"default": "hangup", "rules": []}},
