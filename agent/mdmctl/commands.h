@@ -16,6 +16,9 @@ Command callsCommand();
 Command smsCommand();
 Command dataCommand();
 Command callStatisticsCommand();
+Command accountCommand();
+Command certificatesCommand();
+Command autostartCommand();
 Command simCommand();
 Command policyCommand();
 

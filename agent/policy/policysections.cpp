@@ -1,6 +1,9 @@
 // SPDX-License-Identifier: LGPL-2.1-or-later
 #include "policysections.h"
 
+#include "accountsection.h"
+#include "autostartsection.h"
+#include "certificatesection.h"
 #include "rulesection.h"
 #include "softwareupdatesection.h"
 
@@ -14,6 +17,9 @@ PolicySections makePolicySections(const Timeouts &timeouts)
     PolicySections sections;
     for (const RuleFamily &family : {RuleFamily::calls(), RuleFamily::sms(), RuleFamily::data()})
         sections.push_back(std::make_unique<RuleSection>(family, timeouts.confirmation));
+    sections.push_back(std::make_unique<AccountSection>());
+    sections.push_back(std::make_unique<CertificateSection>(timeouts.confirmation));
+    sections.push_back(std::make_unique<AutostartSection>());
     sections.push_back(std::make_unique<SoftwareUpdateSection>(timeouts.silence));
     return sections;
 }

@@ -22,19 +22,30 @@ Service Service::mdmProxy()
     return {QStringLiteral("org.corvaneos.mdmproxy"), QStringLiteral("MDM proxy")};
 }
 
+Service Service::certificateHelper()
+{
+    return {QString(), QStringLiteral("certificate helper")};
+}
+
 QString Service::toString() const
 {
+    if (name.isEmpty())
+        return QLatin1String("the ") + description;
     return QStringLiteral("the %1 (%2)").arg(description, name);
 }
 
 bool Service::isRunning() const
 {
+    if (name.isEmpty())
+        return true;
     const QDBusConnection bus = QDBusConnection::systemBus();
     return bus.isConnected() && bus.interface()->isServiceRegistered(name);
 }
 
 Reply Service::ensureRunning() const
 {
+    if (name.isEmpty())
+        return {};
     const Reply reached = SystemBus::reach();
     if (!reached.isDone() || isRunning())
         return reached;

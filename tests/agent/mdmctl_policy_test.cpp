@@ -256,8 +256,8 @@ void MdmctlPolicyTest::wrongPolicyIsRefusedWithThePath_data()
     QTest::newRow("syntax") << QByteArray("{\n\"calls\": ,}") << R"(FILE:2:10: illegal value)";
     QTest::newRow("unknown family")
         << QByteArray(R"({"call": {}})")
-        << R"(FILE: /call: unknown member; must be one of "$schema", "calls", "data", )"
-           R"("description", "name", "sms", "softwareUpdate")";
+        << R"(FILE: /call: unknown member; must be one of "$schema", "accounts", "autostart", )"
+           R"("calls", "certificates", "data", "description", "name", "sms", "softwareUpdate")";
     QTest::newRow("unknown member")
         << QByteArray(R"({"calls": {"dail": {}}})")
         << R"(FILE: /calls/dail: unknown member; must be one of "dial", "incoming")";
@@ -500,6 +500,9 @@ void MdmctlPolicyTest::exportIsWhatCheckAccepts()
     QCOMPARE(exported.status, 0);
     QJsonObject policy = exported.json();
     QVERIFY(policy.take(QStringLiteral("name")).toString().startsWith(QStringLiteral("Exported from ")));
+    // Tests of their own look at these.
+    for (const char *other : {"accounts", "certificates", "autostart"})
+        QVERIFY(!policy.take(QLatin1String(other)).toObject().isEmpty());
     QCOMPARE(policy,
              json(R"({"calls": {"dial": {"default": "allow", "rules": [{"imsi": "1", "action": "block"}]},
                                         "incoming": {"default": "hangup", "rules": []}},

@@ -104,7 +104,7 @@ void MdmctlUsageTest::mistakesAreToldInOneLine_data()
         QTest::newRow(arguments) << QString::fromUtf8(message);
     };
     row("",
-        R"("mdmctl" needs a command: must be one of "update", "calls", "sms", "data", "sim", )"
+        R"("mdmctl" needs a command: must be one of "account", "certificates", "autostart", "update", "calls", "sms", "data", "sim", )"
         R"("call-statistics", "policy", "completion")");
     row("calls --json",
         R"("mdmctl calls" needs a command: must be one of "show", "add", "remove", "set", "clear", )"
@@ -166,7 +166,8 @@ void MdmctlUsageTest::bashCompletes_data()
         QTest::newRow(line) << QString::fromUtf8(expected);
     };
     // A line that ends with a space has an empty word at the cursor.
-    row("mdmctl ", "update calls sms data sim call-statistics policy completion");
+    row("mdmctl ",
+        "account certificates autostart update calls sms data sim call-statistics policy completion");
     row("mdmctl sim ", "list watch imei imsi iccid numbers");
     row("mdmctl p", "policy");
     row("mdmctl calls ", "show add remove set clear default watch");
