@@ -34,10 +34,11 @@ Command program()
                                         "  1  refused or failed\n"
                                         "  2  wrong usage: nothing was sent\n"
                                         "  3  the service that it takes is not available");
-    mdmctl.commands = {updateCommand(),  callsCommand(),          smsCommand(),      dataCommand(),
-                       simCommand(),     callStatisticsCommand(), wifiCommand(),     flightModeCommand(),
-                       proxyCommand(),   countersCommand(),       packagesCommand(), applicationsCommand(),
-                       installCommand(), removeCommand(),         policyCommand()};
+    mdmctl.commands = {updateCommand(),    callsCommand(),          smsCommand(),      dataCommand(),
+                       simCommand(),       callStatisticsCommand(), wifiCommand(),     flightModeCommand(),
+                       proxyCommand(),     countersCommand(),       packagesCommand(), applicationsCommand(),
+                       installCommand(),   removeCommand(),         accountCommand(),  certificatesCommand(),
+                       autostartCommand(), policyCommand()};
     mdmctl.commands.append(completionCommand(mdmctl));
     return mdmctl;
 }

@@ -157,14 +157,16 @@ void PolicyEngine::follow(Entry &entry)
         entry.due = true;
         m_loop.quit();
     };
-    auto watcher
-        = std::make_unique<QDBusServiceWatcher>(entry.section->service().name, QDBusConnection::systemBus());
-    connect(watcher.get(), &QDBusServiceWatcher::serviceRegistered, this, wake);
-    connect(watcher.get(), &QDBusServiceWatcher::serviceUnregistered, this, [&entry, wake] {
-        entry.lost = true;
-        wake();
-    });
-    m_watchers.push_back(std::move(watcher));
+    const QString service = entry.section->service().name;
+    if (!service.isEmpty()) {
+        auto watcher = std::make_unique<QDBusServiceWatcher>(service, QDBusConnection::systemBus());
+        connect(watcher.get(), &QDBusServiceWatcher::serviceRegistered, this, wake);
+        connect(watcher.get(), &QDBusServiceWatcher::serviceUnregistered, this, [&entry, wake] {
+            entry.lost = true;
+            wake();
+        });
+        m_watchers.push_back(std::move(watcher));
+    }
     connect(entry.section, &PolicySection::drifted, this, wake);
     entry.due = true;
 }

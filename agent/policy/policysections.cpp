@@ -1,6 +1,9 @@
 // SPDX-License-Identifier: LGPL-2.1-or-later
 #include "policysections.h"
 
+#include "accountsection.h"
+#include "autostartsection.h"
+#include "certificatesection.h"
 #include "packagesection.h"
 #include "proxysection.h"
 #include "radiosection.h"
@@ -21,6 +24,9 @@ PolicySections makePolicySections(const Timeouts &timeouts)
     sections.push_back(std::make_unique<ProxySection>(timeouts.confirmation));
     for (const Radio radio : {Radio::FlightMode, Radio::WiFi})
         sections.push_back(std::make_unique<RadioSection>(radio, timeouts.confirmation));
+    sections.push_back(std::make_unique<AccountSection>());
+    sections.push_back(std::make_unique<CertificateSection>(timeouts.confirmation));
+    sections.push_back(std::make_unique<AutostartSection>());
     sections.push_back(std::make_unique<SoftwareUpdateSection>(timeouts.silence));
     return sections;
 }

@@ -10,6 +10,8 @@
 
 #include <algorithm>
 #include <fcntl.h>
+#include <sys/prctl.h>
+#include <sys/resource.h>
 #include <termios.h>
 #include <unistd.h>
 
@@ -28,9 +30,18 @@ Secret refused(const QString &source, const QString &why)
     return {{Reply::Refused, QStringLiteral("%1 %2").arg(source, why)}, {}};
 }
 
+/** What is in memory must not come into a file by a crash, nor to another process of the same user. */
+void keepMemoryPrivate()
+{
+    constexpr rlimit none{0, 0};
+    ::setrlimit(RLIMIT_CORE, &none);
+    ::prctl(PR_SET_DUMPABLE, 0);
+}
+
 /** The secret that @p bytes are, but for a line end behind it. */
 Secret secretFrom(const QString &source, QByteArray bytes)
 {
+    keepMemoryPrivate();
     for (const char lineEnd : {'\n', '\r'}) {
         if (bytes.endsWith(lineEnd))
             bytes.chop(1);

@@ -32,19 +32,30 @@ Service Service::packageKit()
     return {QStringLiteral("org.freedesktop.PackageKit"), QStringLiteral("package manager")};
 }
 
+Service Service::certificateHelper()
+{
+    return {QString(), QStringLiteral("certificate helper")};
+}
+
 QString Service::toString() const
 {
+    if (name.isEmpty())
+        return QLatin1String("the ") + description;
     return QStringLiteral("the %1 (%2)").arg(description, name);
 }
 
 bool Service::isRunning() const
 {
+    if (name.isEmpty())
+        return true;
     const QDBusConnection bus = QDBusConnection::systemBus();
     return bus.isConnected() && bus.interface()->isServiceRegistered(name);
 }
 
 Reply Service::ensureRunning() const
 {
+    if (name.isEmpty())
+        return {};
     const Reply reached = SystemBus::reach();
     if (!reached.isDone() || isRunning())
         return reached;

@@ -13,13 +13,15 @@ namespace Agent
 
 /** A service on the system bus, as the library's classes need it. */
 struct Service {
-    QString name; ///< on the bus
+    QString name; ///< on the bus; empty for what is not there
     QString description; ///< for people
 
     static Service telephony();
     static Service connectionManager();
     static Service mdmProxy();
     static Service packageKit();
+    /** A program rather than a service of the bus: it has no name there, and is always at hand. */
+    static Service certificateHelper();
 
     /** "the telephony service (org.ofono)" */
     QString toString() const;

@@ -25,12 +25,17 @@ QString seconds(std::chrono::milliseconds time)
 
 Wait::Wait(const Service &service, std::chrono::milliseconds time, const QString &awaited)
     : m_service(service)
-    , m_watcher(service.name, QDBusConnection::systemBus(), QDBusServiceWatcher::WatchForUnregistration)
     , m_refusals(refusals, [this](const QString &reason) { end(Reply::Refused, m_service.refusal(reason)); })
 {
-    connect(&m_watcher, &QDBusServiceWatcher::serviceUnregistered, this,
-            [this] { end(Reply::ServiceLost, m_service.notRunning().text); });
-    connect(&m_bus, &SystemBus::lost, this, [this](const Reply &reply) { end(reply.outcome, reply.text); });
+    if (!service.name.isEmpty()) {
+        m_watcher.setConnection(QDBusConnection::systemBus());
+        m_watcher.setWatchMode(QDBusServiceWatcher::WatchForUnregistration);
+        m_watcher.addWatchedService(service.name);
+        connect(&m_watcher, &QDBusServiceWatcher::serviceUnregistered, this,
+                [this] { end(Reply::ServiceLost, m_service.notRunning().text); });
+        connect(&m_bus, &SystemBus::lost, this,
+                [this](const Reply &reply) { end(reply.outcome, reply.text); });
+    }
     if (Interruption *interruption = Interruption::instance()) {
         connect(interruption, &Interruption::requested, this, [this] { end(Reply::Interrupted); });
         if (interruption->isRequested())

@@ -77,18 +77,39 @@ void addFiles(const QJsonObject &profile, PhoneFiles &files)
         = std::filesystem::read_symlink("/proc/self/exe").parent_path() / "corvane-mdm-certificate";
 }
 
-/** What is wrong with the entry at @p pointer. */
-QString problemOf(const QString &pointer, const QJsonObject &entry)
+/** What is wrong with @p authority, which is at @p pointer. */
+QString problemOfAuthority(const QString &pointer, const QString &authority)
 {
-    const bool hasAuthority = entry.contains(QLatin1String("authority"));
-    if (hasAuthority == entry.contains(QLatin1String("content")))
-        return pointer + QStringLiteral(": must have either authority or content");
-    if (!hasAuthority || !contentOf(entry).isEmpty())
+    if (!certificateOf(authority).isEmpty())
         return QString();
     QStringList known = QDir(authoritiesFolder).entryList(QDir::Files, QDir::Name);
     known.replaceInStrings(QStringLiteral(".pem"), QString());
-    return QStringLiteral("%1/authority: must be one of %2; is %3")
-        .arg(pointer, known.join(QLatin1String(", ")), entry.value(QLatin1String("authority")).toString());
+    return QStringLiteral("%1: must be one of %2; is %3")
+        .arg(pointer, known.join(QLatin1String(", ")), authority);
+}
+
+/** What is wrong with @p entries, which are at @p pointer. */
+QString problemOfFiles(const QString &pointer, const QJsonArray &entries)
+{
+    QStringList names;
+    for (int i = 0; i < entries.size(); ++i) {
+        const QJsonObject entry = entries.at(i).toObject();
+        const QString place = QStringLiteral("%1/%2").arg(pointer).arg(i);
+        const QString name = entry.value(QLatin1String("file")).toString();
+        if (names.contains(name))
+            return QStringLiteral("%1/file: there is a file %2 already; each is named once").arg(place, name);
+        names << name;
+        const bool hasAuthority = entry.contains(QLatin1String("authority"));
+        if (hasAuthority == entry.contains(QLatin1String("content")))
+            return place + QStringLiteral(": must have either authority or content");
+        const QString problem = hasAuthority
+            ? problemOfAuthority(place + QStringLiteral("/authority"),
+                                 entry.value(QLatin1String("authority")).toString())
+            : QString();
+        if (!problem.isEmpty())
+            return problem;
+    }
+    return QString();
 }
 
 QString problemOfProfile(const QJsonObject &profile)
@@ -96,19 +117,16 @@ QString problemOfProfile(const QJsonObject &profile)
     const QJsonObject part = partOf(profile);
     const QJsonArray system = part.value(QLatin1String("system")).toArray();
     for (int i = 0; i < system.size(); ++i) {
-        const QString problem = problemOf(QStringLiteral("/certificates/system/%1").arg(i),
-                                          {{QStringLiteral("authority"), system.at(i)}});
+        const QString problem
+            = problemOfAuthority(QStringLiteral("/certificates/system/%1").arg(i), system.at(i).toString());
         if (!problem.isEmpty())
             return problem;
     }
     for (const QLatin1String list : {QLatin1String("installed"), QLatin1String("blacklisted")}) {
-        const QJsonArray entries = part.value(list).toArray();
-        for (int i = 0; i < entries.size(); ++i) {
-            const QString problem
-                = problemOf(QStringLiteral("/certificates/%1/%2").arg(list).arg(i), entries.at(i).toObject());
-            if (!problem.isEmpty())
-                return problem;
-        }
+        const QString problem
+            = problemOfFiles(QLatin1String("/certificates/") + list, part.value(list).toArray());
+        if (!problem.isEmpty())
+            return problem;
     }
     return QString();
 }

@@ -58,6 +58,11 @@ bool Mdmctl::waitForErrors(const QString &text)
     return waitUntil([&] { return QString::fromUtf8(m_errors).contains(text); });
 }
 
+qint64 Mdmctl::processId() const
+{
+    return m_process.processId();
+}
+
 void Mdmctl::interrupt(int signal)
 {
     ::kill(pid_t(m_process.processId()), signal);

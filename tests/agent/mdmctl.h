@@ -34,6 +34,7 @@ public:
     /** The same for standard error. */
     bool waitForErrors(const QString &text);
 
+    qint64 processId() const;
     void interrupt(int signal);
     Result finish();
 

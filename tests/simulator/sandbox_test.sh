@@ -328,6 +328,20 @@ refusals_help() {
     refusal 2 'wrong.json: /notifications/0/time: ' --device wrong.json true
     profile '{"notifications": [{"owner": "x", "summary": "x", "remoteActions": [{"deep": [{"none": null}]}]}]}'
     refusal 2 'wrong.json: /notifications/0/remoteActions/0/deep/0/none' --device wrong.json true
+    profile '{"accounts": {"providers": [{"name": "a", "services": ["s"]}, {"name": "a", "services": ["s"]}]}}'
+    refusal 2 'wrong.json: /accounts/providers/1/name: ' --device wrong.json true
+    profile '{"accounts": {"present": [{"provider": "none", "user": "u"}]}}'
+    refusal 2 'wrong.json: /accounts/present/0/provider: .*email, corvane-cloud' --device wrong.json true
+    profile '{"autostart": ["mail"]}'
+    refusal 2 'wrong.json: /autostart/0: ' --device wrong.json true
+    profile '{"certificates": {"system": ["nobody"]}}'
+    refusal 2 'wrong.json: /certificates/system/0: must be one of corvane-root, ' --device wrong.json true
+    profile '{"certificates": {"installed": [{"file": "a.crt", "content": ""}, {"file": "b.crt"}]}}'
+    refusal 2 'wrong.json: /certificates/installed/1: must have either authority or content' --device wrong.json true
+    profile '{"certificates": {"blacklisted": [{"file": "a", "content": ""}, {"file": "a", "content": ""}]}}'
+    refusal 2 'wrong.json: /certificates/blacklisted/1/file: ' --device wrong.json true
+    profile '{"certificates": {"installed": [{"file": "a.crt", "authority": "nobody"}]}}'
+    refusal 2 'wrong.json: /certificates/installed/0/authority: ' --device wrong.json true
     profile '{"sims": [{"imsi": "244051"}, {"imsi": "244051"}]}'
     refusal 2 'wrong.json: /sims/1/imsi: ' --device wrong.json true
     profile '{"sims": [{"provider": "None"}]}'
