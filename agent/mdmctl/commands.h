@@ -21,16 +21,28 @@ Command callStatisticsCommand();
 Command simCommand();
 Command wifiCommand();
 Command flightModeCommand();
+Command cellularCommand();
+Command apnCommand();
 Command policyCommand();
 
 // Options that commands share.
 Option jsonOption();
 Option timeoutOption(const QString &meaning);
+Option lookOption();
+
+/** The argument that is the subscriber identity of a SIM, and its name. */
+Argument imsiArgument();
+QString imsiName();
+/** What is wrong with a subscriber identity; empty when nothing is. */
+QString imsiFault(const QString &imsi);
 
 bool wantsJson(const Values &values);
 
 /** Prints what was asked for in the form that was asked for. */
 void printResult(const Values &values, const QString &text, const QJsonObject &json);
+
+/** Goes before what now holds; empty for a change. */
+QString unchangedNote(bool changed);
 
 /** The timeouts that hold unless the command line says otherwise. */
 Timeouts timeoutsOf(const Values &values);
