@@ -5,6 +5,7 @@
 #include "command.h"
 #include "timeouts.h"
 
+#include <QtCore/QDateTime>
 #include <QtCore/QJsonObject>
 
 namespace Corvane
@@ -23,6 +24,7 @@ Command wifiCommand();
 Command flightModeCommand();
 Command cellularCommand();
 Command apnCommand();
+Command notifyCommand();
 Command policyCommand();
 
 // Options that commands share.
@@ -35,6 +37,11 @@ Argument imsiArgument();
 QString imsiName();
 /** What is wrong with a subscriber identity; empty when nothing is. */
 QString imsiFault(const QString &imsi);
+
+/** The time that @p text is, in UTC; without a zone it is local. Invalid for what is wrong with timeFault().
+ */
+QDateTime timeFrom(const QString &text);
+QString timeFault(const QString &value);
 
 bool wantsJson(const Values &values);
 

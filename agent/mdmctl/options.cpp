@@ -45,6 +45,20 @@ Option timeoutOption(const QString &meaning)
     return {timeoutName, meaning, QStringLiteral("SECONDS"), timeoutFault};
 }
 
+QDateTime timeFrom(const QString &text)
+{
+    // Neither an offset nor a zone reaches the phone, so all times are sent in UTC.
+    const QDateTime time = QDateTime::fromString(text, Qt::ISODateWithMs);
+    return time.isValid() ? time.toUTC() : QDateTime();
+}
+
+QString timeFault(const QString &value)
+{
+    return timeFrom(value).isValid()
+        ? QString()
+        : QStringLiteral("must be a date, or a date and time, as in 2026-03-02 or 2026-03-02T09:15:00Z");
+}
+
 Argument imsiArgument()
 {
     return {imsiName(), QStringLiteral("Subscriber identity of the SIM, up to 15 digits"), {}, imsiFault};
