@@ -31,6 +31,11 @@ Sim Phone::cardWithImsi(const QString &imsi) const
 
 Phone::Phone(const QJsonObject &profile)
 {
+    const QJsonObject power = profile.value(QLatin1String("battery")).toObject();
+    battery = {power.value(QLatin1String("present")).toBool(),
+               power.value(QLatin1String("percentage")).toDouble(),
+               power.value(QLatin1String("charger")).toBool()};
+
     const QJsonArray slots = profile.value(QLatin1String("sims")).toArray();
     for (const QJsonValue &slot : slots) {
         const QJsonObject card = slot.toObject();
@@ -47,6 +52,13 @@ Phone::Phone(const QJsonObject &profile)
         m_cards.emplace(sim.imsi, sim);
         sims.push_back(sim);
     }
+}
+
+QJsonObject Battery::describe() const
+{
+    return {{QStringLiteral("present"), isPresent},
+            {QStringLiteral("percentage"), percentage},
+            {QStringLiteral("charger"), hasCharger}};
 }
 
 std::optional<std::size_t> Phone::slotNumbered(const QString &text) const

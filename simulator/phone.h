@@ -30,6 +30,14 @@ struct Sim {
     bool isUsable() const;
 };
 
+struct Battery {
+    bool isPresent = false;
+    double percentage = 0; ///< 0 to 100
+    bool hasCharger = false; ///< that is connected
+
+    QJsonObject describe() const;
+};
+
 /** What several services know of the phone. */
 class Phone
 {
@@ -44,6 +52,7 @@ public:
     std::optional<std::size_t> slotNumbered(const QString &text) const;
 
     std::vector<Sim> sims; ///< by slot
+    Battery battery;
     CellularLinks cellularLinks;
 
 private:

@@ -2,6 +2,7 @@
 #include "realdaemons.h"
 
 #include "atmodem/emulatedmodems.h"
+#include "emulatedbattery.h"
 #include "networkcables.h"
 
 namespace Corvane
@@ -51,6 +52,21 @@ RealDaemon connman()
     };
 }
 
+RealDaemon upower()
+{
+    return {
+        QStringLiteral("upower"),
+        {QStringLiteral("org.freedesktop.UPower")},
+        {"/usr/bin/umockdev-run", "-d", EmulatedBattery::descriptionFile(), "--", "/usr/libexec/upowerd"},
+        "umockdev, and upower",
+        {"/var/lib/upower"},
+        {},
+        [](Phone &phone) -> std::unique_ptr<DaemonHardware> {
+            return std::make_unique<EmulatedBattery>(phone.battery);
+        },
+    };
+}
+
 } // namespace
 
 std::string RealDaemon::logFile() const
@@ -60,8 +76,8 @@ std::string RealDaemon::logFile() const
 
 const std::vector<RealDaemon> &realDaemons()
 {
-    static const std::vector<RealDaemon> daemons{ofonoWithOurPlugin(),
-                                                 stockOfono(QStringLiteral("stock-ofono")), connman()};
+    static const std::vector<RealDaemon> daemons{
+        ofonoWithOurPlugin(), stockOfono(QStringLiteral("stock-ofono")), connman(), upower()};
     return daemons;
 }
 

@@ -1,10 +1,13 @@
 // SPDX-License-Identifier: LGPL-2.1-or-later
 // Uses every public class from outside of the project. Where no service answers, it must work as well.
 #include <corvanemdm/applications.h>
+#include <corvanemdm/batteryinfo.h>
 #include <corvanemdm/callstatistics.h>
 #include <corvanemdm/connectivitysettings.h>
 #include <corvanemdm/corvanemdm_global.h>
+#include <corvanemdm/datetimesettings.h>
 #include <corvanemdm/locationinfo.h>
+#include <corvanemdm/locationsettings.h>
 #include <corvanemdm/notificationinfo.h>
 #include <corvanemdm/simfilter.h>
 #include <corvanemdm/siminfo.h>
@@ -16,6 +19,9 @@
 #include <QtCore/QCoreApplication>
 #include <QtCore/QDebug>
 #include <QtCore/QTextStream>
+
+#include <algorithm>
+#include <iterator>
 
 using namespace Corvane::Mdm;
 
@@ -112,6 +118,32 @@ bool locationInfoWorks()
     return info.satellitesInUse() == -1 && !position.timestamp.isValid() && position.latitude == 0.0;
 }
 
+bool locationSettingsWork()
+{
+    const LocationSettings settings;
+    QObject::connect(&settings, &LocationSettings::locationEnabledChanged, &settings, [] {});
+    const LocationSettings::DataSources satellites = LocationSettings::GpsData | LocationSettings::SbasData;
+    return satellites.testFlag(LocationSettings::GpsData)
+        && settings.availableAgpsProviders().contains(QStringLiteral("here"))
+        == settings.agpsAvailable(QStringLiteral("here"));
+}
+
+bool dateTimeSettingsWork()
+{
+    DateTimeSettings settings;
+    QObject::connect(&settings, &DateTimeSettings::timeZoneChanged, &settings, [] {});
+    // Nothing is known before the event loop has run.
+    return !settings.ready() && settings.timeZone().isEmpty()
+        && settings.supportedTimeZones().contains(QStringLiteral("Europe/Helsinki"));
+}
+
+bool batteryInfoWorks()
+{
+    const BatteryInfo battery;
+    QObject::connect(&battery, &BatteryInfo::chargePercentageChanged, &battery, [](int) {});
+    return battery.chargePercentage() == -1 && battery.status() == BatteryInfo::BatteryStatusUnknown;
+}
+
 QString latestVersion()
 {
     const SoftwareUpdate update;
@@ -125,9 +157,13 @@ QString latestVersion()
 int main(int argc, char **argv)
 {
     QCoreApplication application(argc, argv);
-    const bool works = simFilterWorks() && simVoiceCallFilterWorks() && otherFiltersWork() && simInfoWorks()
-        && connectivitySettingsWork() && callStatisticsWork() && applicationsWork() && notificationInfoWorks()
-        && locationInfoWorks();
+    bool (*const checks[])() = {
+        simFilterWorks,    simInfoWorks,         connectivitySettingsWork, simVoiceCallFilterWorks,
+        otherFiltersWork,  callStatisticsWork,   applicationsWork,         notificationInfoWorks,
+        locationInfoWorks, locationSettingsWork, dateTimeSettingsWork,     batteryInfoWorks,
+    };
+    const bool works
+        = std::all_of(std::begin(checks), std::end(checks), [](bool (*check)()) { return check(); });
     QTextStream(stdout) << (works ? "consumer works" : "consumer fails") << ", update: " << latestVersion()
                         << '\n';
     return works ? 0 : 1;
