@@ -34,20 +34,6 @@ QString numberFault(const QString &value)
     return isNumber ? QString() : QStringLiteral("must be a whole number");
 }
 
-QDateTime timeFrom(const QString &text)
-{
-    // Neither an offset nor a zone reaches the phone, so all times are sent in UTC.
-    const QDateTime time = QDateTime::fromString(text, Qt::ISODateWithMs);
-    return time.isValid() ? time.toUTC() : QDateTime();
-}
-
-QString timeFault(const QString &value)
-{
-    return timeFrom(value).isValid()
-        ? QString()
-        : QStringLiteral("must be a date, or a date and time, as in 2026-03-02 or 2026-03-02T09:15:00Z");
-}
-
 CallStatistics::Filter filterFrom(const Values &values)
 {
     CallStatistics::Filter filter;

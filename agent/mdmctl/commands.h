@@ -5,6 +5,7 @@
 #include "command.h"
 #include "timeouts.h"
 
+#include <QtCore/QDateTime>
 #include <QtCore/QJsonObject>
 
 namespace Corvane
@@ -30,16 +31,34 @@ Command wifiCommand();
 Command flightModeCommand();
 Command proxyCommand();
 Command countersCommand();
+Command cellularCommand();
+Command apnCommand();
+Command notifyCommand();
 Command policyCommand();
 
 // Options that commands share.
 Option jsonOption();
 Option timeoutOption(const QString &meaning);
+Option lookOption();
+
+/** The argument that is the subscriber identity of a SIM, and its name. */
+Argument imsiArgument();
+QString imsiName();
+/** What is wrong with a subscriber identity; empty when nothing is. */
+QString imsiFault(const QString &imsi);
+
+/** The time that @p text is, in UTC; without a zone it is local. Invalid for what is wrong with timeFault().
+ */
+QDateTime timeFrom(const QString &text);
+QString timeFault(const QString &value);
 
 bool wantsJson(const Values &values);
 
 /** Prints what was asked for in the form that was asked for. */
 void printResult(const Values &values, const QString &text, const QJsonObject &json);
+
+/** Goes before what now holds; empty for a change. */
+QString unchangedNote(bool changed);
 
 /** The timeouts that hold unless the command line says otherwise. */
 Timeouts timeoutsOf(const Values &values);

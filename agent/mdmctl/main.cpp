@@ -34,11 +34,13 @@ Command program()
                                         "  1  refused or failed\n"
                                         "  2  wrong usage: nothing was sent\n"
                                         "  3  the service that it takes is not available");
-    mdmctl.commands = {updateCommand(),    callsCommand(),          smsCommand(),      dataCommand(),
-                       simCommand(),       callStatisticsCommand(), wifiCommand(),     flightModeCommand(),
-                       proxyCommand(),     countersCommand(),       packagesCommand(), applicationsCommand(),
-                       installCommand(),   removeCommand(),         accountCommand(),  certificatesCommand(),
-                       autostartCommand(), policyCommand()};
+    mdmctl.commands = {updateCommand(),    callsCommand(),        smsCommand(),
+                       dataCommand(),      simCommand(),          callStatisticsCommand(),
+                       wifiCommand(),      flightModeCommand(),   cellularCommand(),
+                       apnCommand(),       proxyCommand(),        countersCommand(),
+                       packagesCommand(),  applicationsCommand(), installCommand(),
+                       removeCommand(),    accountCommand(),      certificatesCommand(),
+                       autostartCommand(), notifyCommand(),       policyCommand()};
     mdmctl.commands.append(completionCommand(mdmctl));
     return mdmctl;
 }

@@ -3,6 +3,8 @@
 
 #include "output.h"
 
+#include <QtCore/QRegularExpression>
+
 #include <cmath>
 
 namespace Corvane
@@ -15,6 +17,12 @@ namespace
 
 const QLatin1String jsonName("--json");
 const QLatin1String timeoutName("--timeout");
+const QLatin1String lookName("--look");
+
+std::chrono::milliseconds millisecondsFrom(const QString &seconds)
+{
+    return std::chrono::milliseconds(std::llround(seconds.toDouble() * 1000));
+}
 
 QString timeoutFault(const QString &value)
 {
@@ -37,6 +45,36 @@ Option timeoutOption(const QString &meaning)
     return {timeoutName, meaning, QStringLiteral("SECONDS"), timeoutFault};
 }
 
+QDateTime timeFrom(const QString &text)
+{
+    // Neither an offset nor a zone reaches the phone, so all times are sent in UTC.
+    const QDateTime time = QDateTime::fromString(text, Qt::ISODateWithMs);
+    return time.isValid() ? time.toUTC() : QDateTime();
+}
+
+QString timeFault(const QString &value)
+{
+    return timeFrom(value).isValid()
+        ? QString()
+        : QStringLiteral("must be a date, or a date and time, as in 2026-03-02 or 2026-03-02T09:15:00Z");
+}
+
+Argument imsiArgument()
+{
+    return {imsiName(), QStringLiteral("Subscriber identity of the SIM, up to 15 digits"), {}, imsiFault};
+}
+
+QString imsiName()
+{
+    return QStringLiteral("IMSI");
+}
+
+QString imsiFault(const QString &imsi)
+{
+    static const QRegularExpression wellFormed(QStringLiteral("\\A[0-9]{1,15}\\z"));
+    return wellFormed.match(imsi).hasMatch() ? QString() : QStringLiteral("must be 1 to 15 decimal digits");
+}
+
 bool wantsJson(const Values &values)
 {
     return values.has(jsonName);
@@ -50,12 +88,25 @@ void printResult(const Values &values, const QString &text, const QJsonObject &j
         print(text);
 }
 
+QString unchangedNote(bool changed)
+{
+    return changed ? QString() : QStringLiteral("Already so, nothing to change.\n");
+}
+
+Option lookOption()
+{
+    return {lookName, QStringLiteral("Look so often at what the phone does not announce (default: 30)"),
+            QStringLiteral("SECONDS"), timeoutFault};
+}
+
 Timeouts timeoutsOf(const Values &values)
 {
-    if (!values.has(timeoutName))
-        return {};
-    const std::chrono::milliseconds given(std::llround(values.first(timeoutName).toDouble() * 1000));
-    return {given, given};
+    Timeouts timeouts;
+    if (values.has(timeoutName))
+        timeouts.confirmation = timeouts.silence = millisecondsFrom(values.first(timeoutName));
+    if (values.has(lookName))
+        timeouts.look = millisecondsFrom(values.first(lookName));
+    return timeouts;
 }
 
 } // namespace Agent

@@ -214,9 +214,12 @@ Command policyCommand()
 
     Command watch
         = command(QStringLiteral("watch"), QStringLiteral("Keep the phone as a policy wants it"), runWatch);
+    watch.options.append(lookOption());
     watch.description = QStringLiteral(
         "Applies the policy, then puts right what drifts from it, until it is interrupted (Ctrl-C, exit\n"
-        "status 0). A service that leaves and comes back is taken up again.\n\n"
+        "status 0). A service that leaves and comes back is taken up again.\n"
+        "The phone does not announce when technologies, access points or mobile data change: it is looked at "
+        "them\nevery 30 seconds.\n\n"
         "JSON: one object a line with \"time\" and \"event\": \"setting\" with the members that \"policy "
         "apply\"\n"
         "gives a setting, and \"watching\" with \"policy\" once the policy has been applied.");

@@ -44,8 +44,7 @@ Run runSwitch(bool on)
         if (!reply.isDone())
             return conclude(reply);
         const bool changed = before.value != on;
-        const QString text = subject.text(on);
-        printResult(values, changed ? text : QStringLiteral("Already so, nothing to change. ") + text,
+        printResult(values, unchangedNote(changed) + subject.text(on),
                     {{enabledMember, on}, {QStringLiteral("changed"), changed}});
         return ExitDone;
     };

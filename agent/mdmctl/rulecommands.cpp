@@ -10,7 +10,6 @@
 #include "wait.h"
 
 #include <QtCore/QJsonObject>
-#include <QtCore/QRegularExpression>
 
 namespace Corvane
 {
@@ -23,19 +22,12 @@ namespace
 {
 
 const QLatin1String directionArgument("DIR");
-const QLatin1String imsiArgument("IMSI");
 const QLatin1String actionArgument("ACTION");
 const QLatin1String ruleArgument("IMSI=ACTION");
 
 Traffic trafficOf(const RuleFamily &family, const Values &values)
 {
     return family.trafficNamed(values.first(directionArgument));
-}
-
-QString imsiFault(const QString &imsi)
-{
-    static const QRegularExpression wellFormed(QStringLiteral("\\A[0-9]{1,15}\\z"));
-    return wellFormed.match(imsi).hasMatch() ? QString() : QStringLiteral("must be 1 to 15 decimal digits");
 }
 
 QString ruleFault(const RuleFamily &family, const QString &rule)
@@ -132,11 +124,9 @@ int runChange(RuleFilter &filter, const Values &values, const std::function<Repl
         print(withDirection(traffic, now));
         return ExitDone;
     }
-    if (!changed)
-        print(QStringLiteral("Already so, nothing to change."));
     Table table = rulesTable();
     addRow(&table, filter, traffic);
-    print(table.toString());
+    print(unchangedNote(changed) + table.toString());
     return ExitDone;
 }
 
@@ -145,14 +135,14 @@ int runAdd(RuleFilter &filter, const Values &values)
     const Traffic traffic = trafficOf(filter.family(), values);
     const auto action = actionNamed(traffic, values.first(actionArgument));
     return runChange(filter, values, [&] {
-        return filter.setRule(traffic, {values.first(imsiArgument), *action});
+        return filter.setRule(traffic, {values.first(imsiName()), *action});
     });
 }
 
 int runRemove(RuleFilter &filter, const Values &values)
 {
     const Traffic traffic = trafficOf(filter.family(), values);
-    const QString imsi = values.first(imsiArgument);
+    const QString imsi = values.first(imsiName());
     return runChange(filter, values, [&]() -> Reply {
         if (!filter.hasRule(traffic, imsi)) {
             const QStringList words{QStringLiteral("no"), directionName(traffic), QStringLiteral("rule for"),
@@ -297,8 +287,7 @@ private:
     Command watch() const;
 
     const RuleFamily m_family;
-    const Argument m_imsi{
-        imsiArgument, QStringLiteral("Subscriber identity of the SIM, up to 15 digits"), {}, imsiFault};
+    const Argument m_imsi = imsiArgument();
     const Argument m_action;
     const Argument m_rules;
 };

@@ -16,6 +16,16 @@ QStringList linesOf(const QString &cell)
     return cell.split(QLatin1Char('\n'));
 }
 
+// What services tell may come from anywhere, and must not steer the terminal.
+QString withoutControls(QString cell)
+{
+    for (QChar &character : cell) {
+        if (character.category() == QChar::Other_Control && character != QLatin1Char('\n'))
+            character = QChar::ReplacementCharacter;
+    }
+    return cell;
+}
+
 QString trimmedEnd(const QString &line)
 {
     int end = line.size();
@@ -52,7 +62,10 @@ Table::Table(const QStringList &heading)
 
 void Table::addRow(const QStringList &cells)
 {
-    m_rows.append(cells);
+    QStringList shown;
+    for (const QString &cell : cells)
+        shown.append(withoutControls(cell));
+    m_rows.append(shown);
 }
 
 QVector<int> Table::columnWidths() const

@@ -11,7 +11,7 @@ namespace Corvane
 namespace Agent
 {
 
-/** Rows of text in aligned columns. A cell may have several lines. */
+/** Rows of text in aligned columns. A cell may have several lines; other control characters are replaced. */
 class Table
 {
 public:

@@ -3,6 +3,7 @@
 
 #include "accountsection.h"
 #include "autostartsection.h"
+#include "cellularsection.h"
 #include "certificatesection.h"
 #include "packagesection.h"
 #include "proxysection.h"
@@ -21,9 +22,10 @@ PolicySections makePolicySections(const Timeouts &timeouts)
     for (const RuleFamily &family : {RuleFamily::calls(), RuleFamily::sms(), RuleFamily::data()})
         sections.push_back(std::make_unique<RuleSection>(family, timeouts.confirmation));
     sections.push_back(std::make_unique<PackageSection>(timeouts.silence));
-    sections.push_back(std::make_unique<ProxySection>(timeouts.confirmation));
     for (const Radio radio : {Radio::FlightMode, Radio::WiFi})
         sections.push_back(std::make_unique<RadioSection>(radio, timeouts.confirmation));
+    sections.push_back(std::make_unique<CellularSection>(timeouts));
+    sections.push_back(std::make_unique<ProxySection>(timeouts.confirmation));
     sections.push_back(std::make_unique<AccountSection>());
     sections.push_back(std::make_unique<CertificateSection>(timeouts.confirmation));
     sections.push_back(std::make_unique<AutostartSection>());

@@ -1,6 +1,7 @@
 // SPDX-License-Identifier: LGPL-2.1-or-later
 #include "mdmctl.h"
 
+#include "terminal.h"
 #include "waiting.h"
 
 #include <QtCore/QJsonDocument>
@@ -29,8 +30,15 @@ Mdmctl::Result Mdmctl::run(const QStringList &arguments, const QByteArray &input
     return mdmctl.finish();
 }
 
-Mdmctl::Mdmctl(const QStringList &arguments)
+void Mdmctl::Process::setupChildProcess()
 {
+    if (terminal)
+        terminal->adopt();
+}
+
+Mdmctl::Mdmctl(const QStringList &arguments, const Terminal *terminal)
+{
+    m_process.terminal = terminal;
     QObject::connect(&m_process, &QProcess::readyReadStandardOutput, &m_process,
                      [this] { m_output += m_process.readAllStandardOutput(); });
     QObject::connect(&m_process, &QProcess::readyReadStandardError, &m_process,

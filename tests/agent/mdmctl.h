@@ -9,6 +9,8 @@
 #include <QtCore/QStringList>
 #include <QtCore/QVector>
 
+class Terminal;
+
 /** mdmctl, as it is run by a person or a script. */
 class Mdmctl
 {
@@ -25,8 +27,8 @@ public:
     /** Runs it to its end. */
     static Result run(const QStringList &arguments, const QByteArray &input = QByteArray());
 
-    /** Starts it. */
-    explicit Mdmctl(const QStringList &arguments);
+    /** Starts it, on @p terminal if there is one, with its streams elsewhere. */
+    explicit Mdmctl(const QStringList &arguments, const Terminal *terminal = nullptr);
     ~Mdmctl();
 
     /** Waits until it has written @p text to its standard output, @p times times. */
@@ -41,7 +43,16 @@ public:
 private:
     Q_DISABLE_COPY(Mdmctl)
 
-    QProcess m_process;
+    class Process : public QProcess
+    {
+    public:
+        const Terminal *terminal = nullptr;
+
+    protected:
+        void setupChildProcess() override;
+    };
+
+    Process m_process;
     QByteArray m_output;
     QByteArray m_errors;
 };

@@ -81,7 +81,7 @@ void MdmctlRadioTest::switchesAndTells_data()
                               << "Wi-Fi is off.\n"
                               << QStringList{wifi.arg(no)};
     QTest::newRow("wifi on") << "wifi on"
-                             << "Already so, nothing to change. Wi-Fi is on.\n"
+                             << "Already so, nothing to change.\nWi-Fi is on.\n"
                              << QStringList();
     QTest::newRow("wifi status") << "wifi status"
                                  << "Wi-Fi is on.\n"
@@ -90,7 +90,7 @@ void MdmctlRadioTest::switchesAndTells_data()
                                     << "Flight mode is on.\n"
                                     << QStringList{manager.arg(yes)};
     QTest::newRow("flight-mode off") << "flight-mode off"
-                                     << "Already so, nothing to change. Flight mode is off.\n"
+                                     << "Already so, nothing to change.\nFlight mode is off.\n"
                                      << QStringList();
     QTest::newRow("flight-mode status") << "flight-mode status"
                                         << "Flight mode is off.\n"
@@ -111,7 +111,7 @@ void MdmctlRadioTest::switchesOnce()
 {
     QCOMPARE(run("flight-mode on").status, 0);
     QCOMPARE(run("flight-mode on").output,
-             QStringLiteral("Already so, nothing to change. Flight mode is on.\n"));
+             QStringLiteral("Already so, nothing to change.\nFlight mode is on.\n"));
     QCOMPARE(writes().size(), 1);
     // Flight mode took Wi-Fi down, which may be wanted within.
     QCOMPARE(run("wifi status").output, QStringLiteral("Wi-Fi is off.\n"));

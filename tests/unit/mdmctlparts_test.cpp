@@ -18,6 +18,7 @@ private Q_SLOTS:
     void tableIsAligned();
     void tableWithCellsOfSeveralLines();
     void tableWithoutEmptyColumns();
+    void tableWithoutControlCharacters();
     void barFitsTheWidth_data();
     void barFitsTheWidth();
     void liveTableIsReplacedInPlace();
@@ -86,6 +87,13 @@ void MdmctlPartsTest::tableWithoutEmptyColumns()
     Table table({QStringLiteral("A"), QStringLiteral("B"), QStringLiteral("C")});
     table.addRow({QStringLiteral("1"), QString(), QStringLiteral("3")});
     QCOMPARE(table.toString(), QStringLiteral("A  C\n1  3"));
+}
+
+void MdmctlPartsTest::tableWithoutControlCharacters()
+{
+    Table table({QStringLiteral("A")});
+    table.addRow({QStringLiteral("a\x1b[2Jb\tc\nd")});
+    QCOMPARE(table.toString(), QString::fromUtf8("A\na�[2Jb�c\nd"));
 }
 
 void MdmctlPartsTest::barFitsTheWidth_data()
