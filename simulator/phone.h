@@ -6,6 +6,7 @@
 #include <QtCore/QString>
 #include <QtCore/QStringList>
 
+#include <functional>
 #include <map>
 #include <optional>
 #include <vector>
@@ -42,6 +43,13 @@ public:
     std::optional<std::size_t> slotNumbered(const QString &text) const;
 
     std::vector<Sim> sims; ///< by slot
+
+    /** Stops every service as soon as what is under way has been answered, and starts them again to restart. */
+    std::function<void(bool restart)> goDown;
+    /** Starts every service of a phone that is off. */
+    std::function<void()> comeUp;
+    bool isOn = true;
+    int restarts = 0; ///< since the simulator started
 
 private:
     std::map<QString, Sim> m_cards; ///< of the profile, by IMSI

@@ -25,9 +25,10 @@ public:
 
 /** What the phone has at fixed paths, beside or in place of what the machine has there. */
 struct PhoneFiles {
-    /** Contents by absolute path, below /etc, /usr or /var. */
+    /** Contents by absolute path, below /etc, /usr, /var, /dev or /sys/class. */
     std::map<std::string, std::string> files;
-    /** Folders below /etc, /usr or /var that everything in the phone may write to. */
+    /** Folders below /etc, /usr or /var that everything in the phone may write to; those below /sys/class are
+     * only there. */
     std::vector<std::string> writableFolders;
 };
 

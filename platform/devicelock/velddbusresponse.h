@@ -1,0 +1,36 @@
+// SPDX-License-Identifier: LGPL-2.1-or-later
+#ifndef CORVANEMDM_PLATFORM_DEVICELOCK_VELDDBUSRESPONSE_H
+#define CORVANEMDM_PLATFORM_DEVICELOCK_VELDDBUSRESPONSE_H
+
+#include <corvanemdm_platform_global.h>
+
+#include <QtCore/QObject>
+#include <QtDBus/QDBusPendingCall>
+
+class QDBusError;
+
+namespace VeldDBus
+{
+
+/**
+ * The answer to a call. It signals once, from the event loop, and is deleted by itself soon after; who deletes
+ * it before hears nothing of the answer.
+ */
+class CORVANEMDM_PLATFORM_EXPORT Response : public QObject
+{
+    Q_OBJECT
+
+public:
+    Response(const QDBusPendingCall &answer, QObject *parent);
+
+Q_SIGNALS:
+    void success();
+    void failure(const QDBusError &error);
+
+private:
+    Q_DISABLE_COPY(Response)
+};
+
+} // namespace VeldDBus
+
+#endif // CORVANEMDM_PLATFORM_DEVICELOCK_VELDDBUSRESPONSE_H
