@@ -91,7 +91,9 @@ public:
                 stop(0, restart);
             });
         };
-        phone.comeUp = [this] { start(); };
+        phone.comeUp = [this] {
+            start();
+        };
     }
 
 private:

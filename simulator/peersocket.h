@@ -16,7 +16,8 @@ namespace Corvane
 namespace Simulator
 {
 
-/** A socket where clients connect to a service directly, with the objects that are offered to each of them. */
+/** A socket where clients connect to a service directly, with the objects that are offered to each of them.
+ */
 class PeerSocket
 {
 public:

@@ -44,7 +44,8 @@ public:
 
     std::vector<Sim> sims; ///< by slot
 
-    /** Stops every service as soon as what is under way has been answered, and starts them again to restart. */
+    /** Stops every service as soon as what is under way has been answered, and starts them again to restart.
+     */
     std::function<void(bool restart)> goDown;
     /** Starts every service of a phone that is off. */
     std::function<void()> comeUp;

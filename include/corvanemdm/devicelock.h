@@ -22,7 +22,8 @@ class DeviceLockPrivate;
  * The three commands do not block. Each has a busy property, and tells its end with one of two signals, after
  * the busy property has gone down. One that is given while the last of its kind still runs supersedes that:
  * the phone may carry out both, but only the end of the newer one is told. A daemon that is away, or goes
- * away, or does not answer for QtDBus's default timeout (25 s), is a failure. Why a command failed is not told.
+ * away, or does not answer for QtDBus's default timeout (25 s), is a failure. Why a command failed is not
+ * told.
  *
  * An object that was made while the daemon was away works once it is there, and again after each restart.
  *
@@ -83,7 +84,8 @@ public:
     bool changingSecurityCode() const;
 
     /**
-     * Whether the partition of the user's data, "/dev/corvane/home", is encrypted. Looks at it with each call.
+     * Whether the partition of the user's data, "/dev/corvane/home", is encrypted. Looks at it with each
+     * call.
      * @return false also when there is none, or the caller may not read it; the logging category
      * "org.corvaneos.device.encryption" has the reason, as debug output.
      */

@@ -19,6 +19,21 @@ const QLatin1String disconnectedMember("Disconnected");
 const QLatin1String peerInterface("org.freedesktop.DBus.Peer");
 const QLatin1String pingMethod("Ping");
 
+/** Closes a peer connection at its end. */
+class Link
+{
+public:
+    explicit Link(const QString &name)
+        : m_name(name)
+    {
+    }
+    ~Link() { QDBusConnection::disconnectFromPeer(m_name); }
+    Q_DISABLE_COPY(Link)
+
+private:
+    const QString m_name;
+};
+
 } // namespace
 
 class Connection::Private : public QObject
@@ -33,21 +48,23 @@ public:
         follow();
     }
 
-    ~Private() override { close(); }
-
     void follow()
     {
+        link = std::make_shared<Link>(current.name());
         current.connect(QString(), localPath, localInterface, disconnectedMember, this, SLOT(tellEnd()));
     }
 
-    void close()
+    void forget()
     {
+        ping.reset();
         current.disconnect(QString(), localPath, localInterface, disconnectedMember, this, SLOT(tellEnd()));
-        QDBusConnection::disconnectFromPeer(current.name());
+        link.reset();
     }
 
     Connection *const q;
     QDBusConnection current;
+    std::shared_ptr<Link> link;
+    std::unique_ptr<QDBusPendingCallWatcher> ping; // goes before the link that it is sent over
 
 private Q_SLOTS:
     void tellEnd()
@@ -66,6 +83,7 @@ Connection::Connection(const QDBusConnection &connection, QObject *parent)
 
 Connection::~Connection()
 {
+    d->forget();
     delete d;
 }
 
@@ -76,11 +94,11 @@ bool Connection::isConnected() const
 
 bool Connection::reconnect(const QDBusConnection &connection)
 {
-    d->close();
+    d->forget();
     d->current = connection;
+    d->follow();
     if (!isConnected())
         return false;
-    d->follow();
     Q_EMIT connected();
     return true;
 }
@@ -90,13 +108,18 @@ QDBusConnection Connection::connection() const
     return d->current;
 }
 
+std::shared_ptr<void> Connection::hold() const
+{
+    return d->link;
+}
+
 void Connection::verify()
 {
     const QDBusMessage ping
         = QDBusMessage::createMethodCall(QString(), QStringLiteral("/"), peerInterface, pingMethod);
-    auto *watcher = new QDBusPendingCallWatcher(d->current.asyncCall(ping), d);
-    connect(watcher, &QDBusPendingCallWatcher::finished, this, [this, watcher] {
-        watcher->deleteLater();
+    d->ping = std::make_unique<QDBusPendingCallWatcher>(d->current.asyncCall(ping));
+    connect(d->ping.get(), &QDBusPendingCallWatcher::finished, this, [this] {
+        d->ping.release()->deleteLater();
         if (!isConnected())
             Q_EMIT lost();
     });

@@ -7,13 +7,15 @@
 #include <QtCore/QObject>
 #include <QtDBus/QDBusConnection>
 
+#include <memory>
+
 namespace VeldDBus
 {
 
 /**
  * A peer connection that can be replaced by a new one when its other end comes back.
  *
- * It closes each peer connection that it was given, when that is replaced and at the end.
+ * It closes each peer connection that it was given, when that is replaced and at the end; see hold().
  */
 class CORVANEMDM_PLATFORM_EXPORT Connection : public QObject
 {
@@ -29,8 +31,13 @@ public:
     bool reconnect(const QDBusConnection &connection);
     QDBusConnection connection() const;
     /**
-     * Asks the other end for a sign of life. That a connection has been lost is noticed with a delay, in which
-     * whoever has it may learn already that the other end is back.
+     * Keeps the peer connection of this moment open for as long as the result is held, also when it has been
+     * replaced. Whoever waits for an answer has to hold it: QtDBus must not close a connection before that.
+     */
+    std::shared_ptr<void> hold() const;
+    /**
+     * Asks the other end for a sign of life. That a connection has been lost is noticed with a delay, in
+     * which whoever has it may learn already that the other end is back.
      */
     void verify();
 

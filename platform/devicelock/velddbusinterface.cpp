@@ -45,7 +45,7 @@ Response *Interface::call(const QString &method, const QVariantList &arguments)
         ? d->connection.connection().asyncCall(d->message(method, arguments))
         : QDBusPendingCall::fromError(
             QDBusError(QDBusError::Disconnected, QStringLiteral("There is no connection")));
-    return new Response(answer, this);
+    return new Response(answer, d->connection, this);
 }
 
 QDBusMessage Interface::blockingCall(const QString &method, const QVariantList &arguments) const

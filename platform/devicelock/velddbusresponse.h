@@ -12,16 +12,20 @@ class QDBusError;
 namespace VeldDBus
 {
 
+class Connection;
+
 /**
- * The answer to a call. It signals once, from the event loop, and is deleted by itself soon after; who deletes
- * it before hears nothing of the answer.
+ * The answer to a call. It signals once, from the event loop, and is deleted by itself soon after; who
+ * deletes it before hears nothing of the answer.
  */
 class CORVANEMDM_PLATFORM_EXPORT Response : public QObject
 {
     Q_OBJECT
 
 public:
-    Response(const QDBusPendingCall &answer, QObject *parent);
+    /** @param connection the one that @p answer comes over */
+    Response(const QDBusPendingCall &answer, const Connection &connection, QObject *parent);
+    ~Response() override;
 
 Q_SIGNALS:
     void success();
@@ -29,6 +33,9 @@ Q_SIGNALS:
 
 private:
     Q_DISABLE_COPY(Response)
+
+    class Private;
+    Private *const d;
 };
 
 } // namespace VeldDBus

@@ -70,7 +70,11 @@ private Q_SLOTS:
     }
 
 private:
-    void reconnect() { connection.reconnect(newPeer()); }
+    void reconnect()
+    {
+        answer.reset();
+        connection.reconnect(newPeer());
+    }
 
     void follow()
     {
@@ -78,8 +82,8 @@ private:
             return;
         QDBusConnection peer = connection.connection();
         peer.connect(QString(), statePath, stateInterface, changedMember, this, SLOT(setState(uint)));
-        answer = std::make_unique<QDBusPendingCallWatcher>(peer.asyncCall(
-            QDBusMessage::createMethodCall(QString(), statePath, stateInterface, getMethod)));
+        answer = std::make_unique<QDBusPendingCallWatcher>(
+            peer.asyncCall(QDBusMessage::createMethodCall(QString(), statePath, stateInterface, getMethod)));
         connect(answer.get(), &QDBusPendingCallWatcher::finished, this, [this] {
             const QDBusPendingReply<uint> reply = *answer;
             answer.release()->deleteLater();
@@ -89,7 +93,6 @@ private:
 
     void forget()
     {
-        // Of a connection that is gone.
         answer.reset();
         setState(Undefined);
     }

@@ -58,8 +58,8 @@ QString codeProblem(const QString &code)
 {
     if (code.size() < shortestCode || code.size() > longestCode)
         return QStringLiteral("The code must have %1 to %2 characters").arg(shortestCode).arg(longestCode);
-    const bool isPrintable
-        = std::all_of(code.begin(), code.end(), [](QChar each) { return each.isPrint() || each.isSurrogate(); });
+    const bool isPrintable = std::all_of(code.begin(), code.end(),
+                                         [](QChar each) { return each.isPrint() || each.isSurrogate(); });
     return isPrintable ? QString() : QStringLiteral("The code must not have control characters");
 }
 
@@ -113,10 +113,9 @@ void DeviceLock::attach(Service &service)
 {
     m_service = &service;
     service.listenAt(socketPath);
-    service.addObject(statePath, stateInterface,
-                      {{QStringLiteral("Get"), [this](MethodCall &call) {
-                            call.reply(g_variant_new("(u)", guint32(m_state)));
-                        }}});
+    service.addObject(statePath, stateInterface, {{QStringLiteral("Get"), [this](MethodCall &call) {
+                                                       call.reply(g_variant_new("(u)", guint32(m_state)));
+                                                   }}});
     service.addObject(managementPath, managementInterface,
                       {
                           {QStringLiteral("SetLockoutMode"),
@@ -214,7 +213,8 @@ void DeviceLock::writeSideloading(bool allowed) const
     g_mkdir_with_parents(settingsFolder, 0755);
     ErrorSlot error;
     if (!g_key_file_save_to_file(file.get(), settingsFile, &error))
-        throw MethodError(QStringLiteral("org.freedesktop.DBus.Error.IOError"), QString::fromUtf8(error->message));
+        throw MethodError(QStringLiteral("org.freedesktop.DBus.Error.IOError"),
+                          QString::fromUtf8(error->message));
 }
 
 QString DeviceLock::lock()
@@ -268,7 +268,8 @@ std::vector<Action> DeviceLock::actions()
          [this](const QStringList &arguments) {
              return enterCode(arguments.first());
          }},
-        {QStringLiteral("power on"), QString(), QStringLiteral("switches a phone on that has shut down"), 0, 0,
+        {QStringLiteral("power on"), QString(), QStringLiteral("switches a phone on that has shut down"), 0,
+         0,
          [this](const QStringList &) {
              if (m_phone.isOn)
                  throw Refusal(QStringLiteral("The phone is on already"));

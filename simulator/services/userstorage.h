@@ -12,8 +12,8 @@ namespace Simulator
 struct PhoneFiles;
 
 /**
- * What the phone's user keeps on it. It lies in folders of the phone's own: /home is the machine's, and out of
- * reach of whatever erases the phone.
+ * What the phone's user keeps on it. It lies in folders of the phone's own: /home is the machine's, and out
+ * of reach of whatever erases the phone.
  */
 class UserStorage
 {

@@ -32,8 +32,8 @@ void logMessage(int, const char *text, void *)
 
 bool DeviceEncryption::isHomeEncrypted()
 {
-    // Without a callback libcryptsetup writes to standard error. There is no device yet that could have one of
-    // its own, and the one for all devices is the application's: it is taken for this call alone.
+    // Without a callback libcryptsetup writes to standard error. There is no device yet that could have one
+    // of its own, and the one for all devices is the application's: it is taken for this call alone.
     crypt_device *initialised = nullptr;
     crypt_set_log_callback(nullptr, logMessage, nullptr);
     const int result = crypt_init(&initialised, HomeDevice);

@@ -22,8 +22,7 @@ const QLatin1String ManagementInterface("org.corvaneos.devicelock.DeviceManageme
 QDBusConnection openPeerConnection()
 {
     static uint count = 0;
-    return QDBusConnection::connectToPeer(SocketAddress,
-                                          QStringLiteral("org.corvaneos.mdm.%1").arg(count++));
+    return QDBusConnection::connectToPeer(SocketAddress, QStringLiteral("org.corvaneos.mdm.%1").arg(count++));
 }
 
 } // namespace

@@ -214,10 +214,8 @@ void DeviceLockLinkTest::namesOfConnectionsNeverRepeat()
     m_phone->stopService(Service);
     for (const auto &lock : many)
         QVERIFY(waitForState(*lock, DeviceLock::Undefined));
-    for (std::size_t count = 0; count < many.size(); ++count)
-        m_phone->startService(Service);
-    QVERIFY(m_reconnections->waitFor());
-    QVERIFY(waitUntil([] { return isConnected(101); }));
+    m_phone->startService(Service);
+    QVERIFY(m_reconnections->waitFor(50));
     for (uint number = 52; number < 102; ++number)
         QVERIFY2(isConnected(number), qPrintable(QString::number(number)));
     QVERIFY(!isConnected(2) && !isConnected(51) && !isConnected(102));

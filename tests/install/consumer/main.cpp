@@ -2,6 +2,7 @@
 // Uses every public class from outside of the project. Where no service answers, it must work as well.
 #include <corvanemdm/callstatistics.h>
 #include <corvanemdm/corvanemdm_global.h>
+#include <corvanemdm/devicelock.h>
 #include <corvanemdm/simfilter.h>
 #include <corvanemdm/siminfo.h>
 #include <corvanemdm/simmobiledatafilter.h>
@@ -67,6 +68,16 @@ bool callStatisticsWork()
     return answers == 0;
 }
 
+bool deviceLockWorks()
+{
+    DeviceLock lock;
+    QObject::connect(&lock, &DeviceLock::deviceCleared, &lock, [] {});
+    // The state comes with the event loop; a partition of the phone is not asserted.
+    lock.isHomeEncrypted();
+    return lock.state() == DeviceLock::Undefined && !lock.clearingDevice()
+        && (DeviceLock::RebootAfterClear | DeviceLock::WipePartitions) == DeviceLock::ClearOptions(3);
+}
+
 QString latestVersion()
 {
     const SoftwareUpdate update;
@@ -81,7 +92,7 @@ int main(int argc, char **argv)
 {
     QCoreApplication application(argc, argv);
     const bool works = simFilterWorks() && simVoiceCallFilterWorks() && otherFiltersWork() && simInfoWorks()
-        && callStatisticsWork();
+        && callStatisticsWork() && deviceLockWorks();
     QTextStream(stdout) << (works ? "consumer works" : "consumer fails") << ", update: " << latestVersion()
                         << '\n';
     return works ? 0 : 1;
