@@ -1,9 +1,9 @@
 // SPDX-License-Identifier: LGPL-2.1-or-later
 #include "jsondocument.h"
 
+#include "inputfile.h"
 #include "schemaexplanation.h"
 
-#include <QtCore/QFile>
 #include <QtCore/QJsonDocument>
 #include <QtCore/QStringList>
 #include <valijson/adapters/qtjson_adapter.hpp>
@@ -11,8 +11,6 @@
 #include <valijson/schema_parser.hpp>
 #include <valijson/validation_results.hpp>
 #include <valijson/validator.hpp>
-
-#include <cstdio>
 
 namespace Corvane
 {
@@ -22,8 +20,6 @@ namespace
 
 // Far beyond any document that a person writes; keeps a mistaken "/dev/zero" from filling the memory.
 constexpr qint64 largestDocument = 16 * 1024 * 1024;
-
-const QLatin1String standardInput("-");
 
 JsonDocument failure(const QString &name, const QString &reason)
 {
@@ -88,25 +84,11 @@ JsonDocument parse(const QString &name, const QByteArray &text, const QByteArray
 
 } // namespace
 
-QString documentName(const QString &fileName)
-{
-    return fileName == standardInput ? QStringLiteral("standard input") : fileName;
-}
-
 JsonDocument readJsonDocument(const QString &fileName, const QByteArray &schema)
 {
-    const QString name = documentName(fileName);
-    QFile file(fileName);
-    const bool opened
-        = fileName == standardInput ? file.open(stdin, QIODevice::ReadOnly) : file.open(QIODevice::ReadOnly);
-    if (!opened)
-        return failure(name, QStringLiteral("cannot be read: %1").arg(file.errorString()));
-    const QByteArray text = file.read(largestDocument + 1);
-    if (text.size() > largestDocument)
-        return failure(name, QStringLiteral("is too large, must be at most 16 MiB"));
-    if (text.isEmpty() && file.error() != QFileDevice::NoError)
-        return failure(name, QStringLiteral("cannot be read: %1").arg(file.errorString()));
-    return parse(name, text, schema);
+    const InputFile input = readInputFile(fileName, largestDocument);
+    return input.error.isEmpty() ? parse(input.name, input.content, schema)
+                                 : failure(input.name, input.error);
 }
 
 } // namespace Corvane

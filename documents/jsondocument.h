@@ -16,9 +16,6 @@ struct JsonDocument {
     bool isValid() const { return error.isEmpty(); }
 };
 
-/** What error texts call @p fileName: "standard input" when it is "-". */
-QString documentName(const QString &fileName);
-
 /**
  * Reads @p fileName ("-": standard input) and checks it against @p schema.
  * A file that cannot be read, is not JSON or does not follow the schema gives a document that is not valid.

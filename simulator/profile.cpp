@@ -3,6 +3,7 @@
 
 #include "component.h"
 
+#include <inputfile.h>
 #include <jsondocument.h>
 
 #include <QtCore/QFile>
@@ -70,12 +71,11 @@ Profile readProfile(const QString &fileName)
     if (!document.isValid())
         return {{}, document.error};
 
-    const QString documentName = fileName == QLatin1String("-") ? QStringLiteral("standard input") : fileName;
     const QJsonObject profile = completed(document.object, builtIn.object);
     for (const ComponentType &type : ComponentRegistration::all()) {
         const QString problem = type.problemOf(profile);
         if (!problem.isEmpty())
-            return {{}, documentName + QStringLiteral(": ") + problem};
+            return {{}, inputFileName(fileName) + QStringLiteral(": ") + problem};
     }
     return {profile, QString()};
 }

@@ -1,6 +1,7 @@
 // SPDX-License-Identifier: LGPL-2.1-or-later
 #include "policy.h"
 
+#include "inputfile.h"
 #include "jsondocument.h"
 
 #include <QtCore/QFile>
@@ -24,14 +25,14 @@ QJsonObject Policy::settingsOf(const PolicySection &section) const
 Policy readPolicy(const QString &fileName, const PolicySections &sections)
 {
     const JsonDocument document = readJsonDocument(fileName, policySchema());
-    Policy policy{document.object.value(QLatin1String("name")).toString(documentName(fileName)),
+    Policy policy{document.object.value(QLatin1String("name")).toString(inputFileName(fileName)),
                   document.object, document.error};
     if (!policy.isValid())
         return policy;
     for (const auto &section : sections) {
         const QString fault = section->fault(policy.settingsOf(*section));
         if (!fault.isEmpty()) {
-            policy.error = QStringLiteral("%1: %2").arg(documentName(fileName), fault);
+            policy.error = QStringLiteral("%1: %2").arg(inputFileName(fileName), fault);
             break;
         }
     }

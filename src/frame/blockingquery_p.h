@@ -6,6 +6,8 @@
 #include <QtDBus/QDBusAbstractInterface>
 #include <QtDBus/QDBusReply>
 
+#include <optional>
+
 namespace Corvane
 {
 namespace Mdm
@@ -15,19 +17,35 @@ namespace Mdm
  * Calls @p method and waits for its answer.
  *
  * An error, a wrong reply type included, is logged as the sentence @p failure followed by the error, and
- * gives @p empty.
+ * gives nothing.
  */
 template <typename T>
-T blockingQuery(QDBusAbstractInterface *interface, const QString &method, const char *failure,
-                const QVariantList &arguments = QVariantList(), const T &empty = T())
+std::optional<T> tryQuery(QDBusAbstractInterface *interface, const QString &method, const char *failure,
+                          const QVariantList &arguments = QVariantList())
 {
     const QDBusReply<T> reply = interface->callWithArgumentList(QDBus::AutoDetect, method, arguments);
     const QDBusError error = reply.error();
     if (error.isValid()) {
         qWarning() << failure << error;
-        return empty;
+        return std::nullopt;
     }
     return reply.value();
+}
+
+/** The same; gives @p empty when there is no answer. */
+template <typename T>
+T blockingQuery(QDBusAbstractInterface *interface, const QString &method, const char *failure,
+                const QVariantList &arguments = QVariantList(), const T &empty = T())
+{
+    return tryQuery<T>(interface, method, failure, arguments).value_or(empty);
+}
+
+/** The same for a method whose answer says nothing but that it is done; what it says is not read. */
+inline void blockingCommand(QDBusAbstractInterface *interface, const QString &method, const char *failure)
+{
+    const QDBusError error(interface->call(method));
+    if (error.isValid())
+        qWarning() << failure << error;
 }
 
 } // namespace Mdm

@@ -487,11 +487,9 @@ void ControlTest::tellsTheState()
     const QByteArray json
         = m_client->control(QStringLiteral("State")).arguments().first().toString().toUtf8();
     const QJsonObject state = QJsonDocument::fromJson(json).object();
-    QCOMPARE(state.keys(),
-             (QStringList{QStringLiteral("callFilters"), QStringLiteral("callLog"),
-                          QStringLiteral("dataFilter"), QStringLiteral("modems"), QStringLiteral("name"),
-                          QStringLiteral("sims"), QStringLiteral("smsFilter"),
-                          QStringLiteral("softwareUpdate"), QStringLiteral("telephony")}));
+    // A part of each service, and what belongs to none.
+    for (const char *part : {"callFilters", "name", "notifications", "sims", "softwareUpdate"})
+        QVERIFY2(state.contains(QLatin1String(part)), part);
     QCOMPARE(state.value(QLatin1String("name")).toString(), QStringLiteral("dual-sim"));
 }
 

@@ -324,6 +324,10 @@ refusals_help() {
     refusal 2 'wrong.json: /callLog/0/time: ' --device wrong.json true
     profile '{"callLog": [{"time": "2026-02-03T00:00:00Z", "direction": "missed", "seconds": 1}]}'
     refusal 2 'wrong.json: /callLog/0/seconds: ' --device wrong.json true
+    profile '{"notifications": [{"owner": "x", "summary": "x", "time": "2026-02-30T00:00:00Z"}]}'
+    refusal 2 'wrong.json: /notifications/0/time: ' --device wrong.json true
+    profile '{"notifications": [{"owner": "x", "summary": "x", "remoteActions": [{"deep": [{"none": null}]}]}]}'
+    refusal 2 'wrong.json: /notifications/0/remoteActions/0/deep/0/none' --device wrong.json true
     profile '{"sims": [{"imsi": "244051"}, {"imsi": "244051"}]}'
     refusal 2 'wrong.json: /sims/1/imsi: ' --device wrong.json true
     profile '{"sims": [{"provider": "None"}]}'

@@ -1,8 +1,11 @@
 // SPDX-License-Identifier: LGPL-2.1-or-later
 // Uses every public class from outside of the project. Where no service answers, it must work as well.
+#include <corvanemdm/applications.h>
 #include <corvanemdm/callstatistics.h>
 #include <corvanemdm/corvanemdm_global.h>
 #include <corvanemdm/devicelock.h>
+#include <corvanemdm/locationinfo.h>
+#include <corvanemdm/notificationinfo.h>
 #include <corvanemdm/simfilter.h>
 #include <corvanemdm/siminfo.h>
 #include <corvanemdm/simmobiledatafilter.h>
@@ -68,6 +71,36 @@ bool callStatisticsWork()
     return answers == 0;
 }
 
+bool applicationsWork()
+{
+    Applications applications;
+    // Nothing but the phone's own lists tells how many there are.
+    const QList<PackageEntry> packages = applications.getInstalledPackages();
+    const QList<ApplicationEntry> entries = applications.getInstalledApplications();
+    ApplicationOperation operation;
+    QObject::connect(&operation, &ApplicationOperation::finished, &operation, [](ApplicationOperation *) {});
+    return packages.size() >= 0 && entries.size() >= 0 && !PackageEntry().isValid()
+        && ApplicationEntry().name().isEmpty() && operation.isSucceeded();
+}
+
+bool notificationInfoWorks()
+{
+    NotificationInfo info;
+    NotificationData data;
+    data.summary = QStringLiteral("Consumer");
+    const uint id = info.createNotification(data);
+    return id == 0 ? info.notifications().isEmpty() : info.closeNotification(id);
+}
+
+bool locationInfoWorks()
+{
+    LocationInfo info;
+    QObject::connect(&info, &LocationInfo::positionChanged, &info, [] {});
+    // Nothing is asked for before something was requested.
+    const LocationInfo::Position position = info.position();
+    return info.satellitesInUse() == -1 && !position.timestamp.isValid() && position.latitude == 0.0;
+}
+
 bool deviceLockWorks()
 {
     DeviceLock lock;
@@ -92,7 +125,8 @@ int main(int argc, char **argv)
 {
     QCoreApplication application(argc, argv);
     const bool works = simFilterWorks() && simVoiceCallFilterWorks() && otherFiltersWork() && simInfoWorks()
-        && callStatisticsWork() && deviceLockWorks();
+        && callStatisticsWork() && deviceLockWorks() && applicationsWork() && notificationInfoWorks()
+        && locationInfoWorks();
     QTextStream(stdout) << (works ? "consumer works" : "consumer fails") << ", update: " << latestVersion()
                         << '\n';
     return works ? 0 : 1;
