@@ -191,22 +191,27 @@ void ControlTest::stopsAndStartsServices()
 {
     const QString stop = QStringLiteral("StopService");
     const QString start = QStringLiteral("StartService");
-    QCOMPARE(control(QStringLiteral("Services")),
-             QStringLiteral("reply([(org.corvaneos.mdmproxy, true), (org.ofono, true)])"));
+    // Which services there are beside these is no matter of the controls.
+    const auto tells = [this](const char *service) {
+        return control(QStringLiteral("Services")).contains(QLatin1String(service));
+    };
+    QVERIFY(tells("(org.corvaneos.mdmproxy, true)"));
+    QVERIFY(tells("(org.ofono, true)"));
     // Stopping and starting what is stopped or running does nothing.
     QCOMPARE(control(start, {ofono}), done);
     QCOMPARE(control(stop, {ofono}), done);
     QCOMPARE(control(stop, {ofono}), done);
-    QCOMPARE(control(QStringLiteral("Services")),
-             QStringLiteral("reply([(org.corvaneos.mdmproxy, true), (org.ofono, false)])"));
+    QVERIFY(tells("(org.corvaneos.mdmproxy, true)"));
+    QVERIFY(tells("(org.ofono, false)"));
     QVERIFY(filterCall().startsWith(QLatin1String("org.freedesktop.DBus.Error.ServiceUnknown")));
     QCOMPARE(control(start, {ofono}), done);
     QCOMPARE(filterCall(), all);
 
-    const QString unknown = refused
-        + QStringLiteral("There is no service \"org.x\"; there are org.corvaneos.mdmproxy, org.ofono");
-    QCOMPARE(control(stop, {QStringLiteral("org.x")}), unknown);
-    QCOMPARE(control(start, {QStringLiteral("org.x")}), unknown);
+    for (const QString &method : {stop, start}) {
+        const QString answer = control(method, {QStringLiteral("org.x")});
+        QVERIFY(answer.startsWith(refused + QStringLiteral("There is no service \"org.x\"; there are ")));
+        QVERIFY(answer.contains(QLatin1String("org.corvaneos.mdmproxy, ")));
+    }
 }
 
 void ControlTest::leavesCallsOfAStoppedServiceUnanswered()
@@ -355,7 +360,7 @@ void ControlTest::refusesWrongFaults_data()
         QTest::newRow(name) << arguments << QString::fromLatin1(sentence);
     };
     row("service", {text, QString(), QString(), QString(), never, QVariantMap()},
-        "There is no service \"x\"; there are org.corvaneos.mdmproxy, org.ofono");
+        "There is no service \"x\"; there are ");
     row("path", {ofono, text, QString(), QString(), never, QVariantMap()},
         "\"x\" is no object path; leave it empty to match all of them");
     row("interface", {ofono, QString(), text, QString(), never, QVariantMap()},
@@ -381,7 +386,8 @@ void ControlTest::refusesWrongFaults()
 {
     QFETCH(QVariantList, arguments);
     QFETCH(QString, sentence);
-    QCOMPARE(control(QStringLiteral("SetFault"), arguments), refused + sentence);
+    const QString answer = control(QStringLiteral("SetFault"), arguments);
+    QVERIFY2(answer.startsWith(refused + sentence), qPrintable(answer));
     QCOMPARE(control(QStringLiteral("Faults")), QStringLiteral("reply([])"));
 }
 

@@ -23,9 +23,9 @@ expect "SIMs of a phone without any" \
         -m org.veldmobile.ofono.ModemManager.GetPresentSims)" "([false, false],)"
 contains "a locked SIM" \
     "$("$simulator" --device "$devices/locked-sim.json" --real stock-ofono -- corvane-simctl state sims)" "pin"
-expect "services" "$("$simulator" --real ofono -- corvane-simctl services)" \
-    "org.corvaneos.mdmproxy  running
-org.ofono               running"
+services=$("$simulator" --real ofono -- corvane-simctl services | tr -s ' ')
+contains "services" "$services" "org.corvaneos.mdmproxy running"
+contains "services" "$services" "org.ofono running"
 expect "its log" "$("$simulator" --real ofono -- grep -c 'oFono version' /run/corvane-simulator/ofono.log)" 1
 
 # A daemon that dies by itself is told of, can be started again, and is not forgotten.
@@ -40,7 +40,7 @@ text=$("$simulator" --real stock-ofono -- sh -c '
     corvane-simctl services' 2>&1) || status=$?
 expect "status with a daemon that dies" $status 125
 contains "message" "$text" "corvane-simulator: /usr/sbin/ofonod was ended by signal 9; stock-ofono said:"
-contains "services after that" "$text" "org.ofono               running"
+contains "services after that" "$(tr -s ' ' <<< "$text")" "org.ofono running"
 
 # In a phone the daemon can be taken away, by root, without anybody missing it.
 if [[ $EUID -eq 0 ]]; then

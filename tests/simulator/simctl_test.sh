@@ -21,12 +21,12 @@ get_all() {
     gdbus call --system -d org.ofono -o /mdm/voicecallfilter/dial -m org.corvaneos.ofono.mdm.VoiceCallFilter.GetAll 2>&1 || true
 }
 
-says 0 $'org.corvaneos.mdmproxy  running\norg.ofono               running' services
+says 0 $'(.*\n)*org.corvaneos.mdmproxy +running\n(.*\n)*org.ofono +running(\n.*)*' services
 says 0 '' stop org.ofono
-says 0 $'.*org.ofono               stopped' services
+says 0 $'(.*\n)*org.ofono +stopped(\n.*)*' services
 says 0 '' start org.ofono
 says 0 '' restart org.ofono
-says 0 $'.*org.ofono               running' services
+says 0 $'(.*\n)*org.ofono +running(\n.*)*' services
 says 1 'corvane-simctl: there is no service "org.ofon"; did you mean "org.ofono"\?' stop org.ofon
 
 says 0 'fault 1' fault error org.ofono GetAll --error a.b.C --message "No way" --times 1
