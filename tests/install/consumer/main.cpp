@@ -6,12 +6,14 @@
 #include <corvanemdm/devicelock.h>
 #include <corvanemdm/locationinfo.h>
 #include <corvanemdm/notificationinfo.h>
+#include <corvanemdm/securitysettings.h>
 #include <corvanemdm/simfilter.h>
 #include <corvanemdm/siminfo.h>
 #include <corvanemdm/simmobiledatafilter.h>
 #include <corvanemdm/simsmsfilter.h>
 #include <corvanemdm/simvoicecallfilter.h>
 #include <corvanemdm/softwareupdate.h>
+#include <corvanemdm/sysinfo.h>
 
 #include <QtCore/QCoreApplication>
 #include <QtCore/QDebug>
@@ -111,6 +113,25 @@ bool deviceLockWorks()
         && (DeviceLock::RebootAfterClear | DeviceLock::WipePartitions) == DeviceLock::ClearOptions(3);
 }
 
+bool sysInfoWorks()
+{
+    // What there is is the machine's matter.
+    const QStringList facts{SysInfo::softwareVersion(), SysInfo::softwareVersionId(),
+                            SysInfo::wlanMacAddress(),  SysInfo::deviceModel(),
+                            SysInfo::deviceUid(),       SysInfo::productName(),
+                            SysInfo::manufacturer(),    SysInfo::bluetoothMacAddress()};
+    return facts.size() == 8;
+}
+
+bool securitySettingsWork()
+{
+    SecuritySettings settings;
+    QObject::connect(&settings, &SecuritySettings::developerModeEnabledChanged, &settings, [] {});
+    // As it is already: nothing happens.
+    settings.setDeveloperModeEnabled(settings.developerModeEnabled());
+    return !settings.sideloadingAllowed();
+}
+
 QString latestVersion()
 {
     const SoftwareUpdate update;
@@ -125,8 +146,8 @@ int main(int argc, char **argv)
 {
     QCoreApplication application(argc, argv);
     const bool works = simFilterWorks() && simVoiceCallFilterWorks() && otherFiltersWork() && simInfoWorks()
-        && callStatisticsWork() && deviceLockWorks() && applicationsWork() && notificationInfoWorks()
-        && locationInfoWorks();
+        && callStatisticsWork() && deviceLockWorks() && sysInfoWorks() && securitySettingsWork()
+        && applicationsWork() && notificationInfoWorks() && locationInfoWorks();
     QTextStream(stdout) << (works ? "consumer works" : "consumer fails") << ", update: " << latestVersion()
                         << '\n';
     return works ? 0 : 1;
