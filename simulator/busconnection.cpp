@@ -214,6 +214,14 @@ void BusConnection::call(const Method &method, GVariant *arguments,
         new Handler(std::move(handler)));
 }
 
+void BusConnection::send(const Method &method, GVariant *arguments) const
+{
+    g_dbus_connection_call(m_connection.get(), method.service.toUtf8().constData(),
+                           method.path.toUtf8().constData(), method.interface.toUtf8().constData(),
+                           method.name.toUtf8().constData(), arguments, nullptr, G_DBUS_CALL_FLAGS_NONE, -1,
+                           nullptr, nullptr, nullptr);
+}
+
 void BusConnection::watchSignal(const QString &service, const QString &member,
                                 std::function<void(const QString &)> handler)
 {

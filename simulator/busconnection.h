@@ -128,6 +128,8 @@ public:
      */
     void call(const Method &method, GVariant *arguments,
               std::function<void(const Variant &reply, const GError *error)> handler) const;
+    /** Calls @p method without waiting for its answer. */
+    void send(const Method &method, GVariant *arguments) const;
     /** @p handler learns of every signal of @p member that @p service emits. */
     void watchSignal(const QString &service, const QString &member,
                      std::function<void(const QString &path)> handler);

@@ -6,6 +6,7 @@
 #include <CLI/CLI.hpp>
 
 #include <algorithm>
+#include <sstream>
 
 namespace
 {
@@ -57,21 +58,29 @@ std::size_t countOwnArguments(const CLI::App &app, const std::vector<std::string
     return std::min(index, arguments.size());
 }
 
-std::vector<RealDaemon> realDaemonsNamed(const std::vector<std::string> &names)
+/** Those that @p list names, separated by commas. */
+std::vector<RealDaemon> realDaemonsNamed(const std::string &list)
 {
     std::vector<RealDaemon> chosen;
-    for (const std::string &name : names) {
+    std::istringstream names(list);
+    for (std::string name; std::getline(names, name, ',');) {
         const auto &known = realDaemons();
         const auto found = std::find_if(known.begin(), known.end(), [&](const RealDaemon &daemon) {
             return daemon.name.toStdString() == name;
         });
         if (found == known.end()) {
-            std::string list;
+            std::string all;
             for (const RealDaemon &daemon : known)
-                list += (list.empty() ? "" : ", ") + daemon.name.toStdString();
+                all += (all.empty() ? "" : ", ") + daemon.name.toStdString();
             throw CLI::ValidationError("--real",
-                                       "there is no real daemon \"" + name + "\"; there are: " + list);
+                                       "there is no real daemon \"" + name + "\"; there are: " + all);
         }
+        const auto rival = std::find_if(chosen.begin(), chosen.end(), [&](const RealDaemon &daemon) {
+            return daemon.busNames.first() == found->busNames.first();
+        });
+        if (rival != chosen.end())
+            throw CLI::ValidationError(
+                "--real", rival->name.toStdString() + " and " + name + " are one and the same service");
         chosen.push_back(*found);
     }
     return chosen;
@@ -86,13 +95,11 @@ int main(int argc, char *argv[])
     app.footer(explanation);
 
     std::string device;
-    std::vector<std::string> realNames;
+    std::string realNames;
     app.add_option("--device", device, "the phone's profile, a JSON file; \"-\" reads standard input")
         ->type_name("PROFILE");
     app.add_option("--real", realNames, "daemons of the distribution to run in place of simulated services")
-        ->type_name("NAME,...")
-        ->delimiter(',')
-        ->expected(1);
+        ->type_name("NAME,...");
     app.set_version_flag("--version", CORVANEMDM_VERSION);
 
     RunSettings settings;

@@ -2,6 +2,8 @@
 #ifndef CORVANE_SIMULATOR_PHONE_H
 #define CORVANE_SIMULATOR_PHONE_H
 
+#include "cellularlinks.h"
+
 #include <QtCore/QJsonObject>
 #include <QtCore/QString>
 #include <QtCore/QStringList>
@@ -43,6 +45,7 @@ public:
     std::optional<std::size_t> slotNumbered(const QString &text) const;
 
     std::vector<Sim> sims; ///< by slot
+    CellularLinks cellularLinks;
 
     /** Stops every service as soon as what is under way has been answered, and starts them again to restart.
      */

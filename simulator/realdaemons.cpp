@@ -2,6 +2,7 @@
 #include "realdaemons.h"
 
 #include "atmodem/emulatedmodems.h"
+#include "networkcables.h"
 
 namespace Corvane
 {
@@ -36,6 +37,20 @@ RealDaemon ofonoWithOurPlugin()
     return ofono;
 }
 
+RealDaemon connman()
+{
+    return {
+        QStringLiteral("connman"),
+        {QStringLiteral("net.connman")},
+        // Its DNS proxy has nothing to forward to.
+        {"/usr/sbin/connmand", "-n", "-r"},
+        "connman",
+        {"/var/lib/connman"},
+        {},
+        [](Phone &) -> std::unique_ptr<DaemonHardware> { return std::make_unique<NetworkCables>(); },
+    };
+}
+
 } // namespace
 
 std::string RealDaemon::logFile() const
@@ -46,7 +61,7 @@ std::string RealDaemon::logFile() const
 const std::vector<RealDaemon> &realDaemons()
 {
     static const std::vector<RealDaemon> daemons{ofonoWithOurPlugin(),
-                                                 stockOfono(QStringLiteral("stock-ofono"))};
+                                                 stockOfono(QStringLiteral("stock-ofono")), connman()};
     return daemons;
 }
 

@@ -96,5 +96,12 @@ void Service::emitSignal(const QString &path, const QString &interface, const QS
         m_connection->emitSignal(path, interface, member, values.get(), destination);
 }
 
+void Service::callClient(const BusConnection::Method &method, GVariant *arguments) const
+{
+    const Variant values(arguments);
+    if (isRunning())
+        m_connection->send(method, values.get());
+}
+
 } // namespace Simulator
 } // namespace Corvane

@@ -48,6 +48,9 @@ public:
     void emitSignal(const QString &path, const QString &interface, const QString &member,
                     GVariant *arguments = nullptr, const QString &destination = QString()) const;
 
+    /** Calls a method of a client, if the service runs, and leaves its answer alone. */
+    void callClient(const BusConnection::Method &method, GVariant *arguments) const;
+
 private:
     void disconnect();
 

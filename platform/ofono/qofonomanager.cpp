@@ -4,31 +4,12 @@
 #include "ofonoobject_p.h"
 
 #include <QtCore/QVariantMap>
-#include <QtDBus/QDBusArgument>
 #include <QtDBus/QDBusObjectPath>
 
 namespace
 {
 
 const QLatin1String managerInterface("org.ofono.Manager");
-const QLatin1String modemListSignature("a(oa{sv})");
-
-/** The paths of a list of modems with their properties. */
-QStringList readModems(const QDBusArgument &list)
-{
-    QStringList modems;
-    list.beginArray();
-    while (!list.atEnd()) {
-        QDBusObjectPath path;
-        QVariantMap properties;
-        list.beginStructure();
-        list >> path >> properties;
-        list.endStructure();
-        modems.append(path.path());
-    }
-    list.endArray();
-    return modems;
-}
 
 } // namespace
 
@@ -75,14 +56,16 @@ private Q_SLOTS:
 private:
     void askForModems()
     {
-        object.call<QDBusPendingReply<>>(
-            QLatin1String("GetModems"), [this](const QDBusPendingReply<> &reply) {
-                const QDBusMessage message = reply.reply();
-                if (message.type() != QDBusMessage::ReplyMessage || message.signature() != modemListSignature)
-                    return;
-                modems = readModems(message.arguments().constFirst().value<QDBusArgument>());
-                setAvailable(true);
-            });
+        object.call<QDBusPendingReply<>>(QLatin1String("GetModems"),
+                                         [this](const QDBusPendingReply<> &reply) {
+                                             const auto listed = listedObjects(reply.reply());
+                                             if (!listed)
+                                                 return;
+                                             modems.clear();
+                                             for (const ListedObject &modem : *listed)
+                                                 modems.append(modem.path);
+                                             setAvailable(true);
+                                         });
     }
 
     void setAvailable(bool isAvailable)

@@ -4,6 +4,8 @@
 #include "ofono.h"
 #include "service.h"
 
+#include <QtCore/QJsonArray>
+
 #include <algorithm>
 
 namespace Corvane
@@ -17,10 +19,13 @@ namespace
 const QLatin1String modemInterface("org.ofono.Modem");
 const QLatin1String simInterface("org.ofono.SimManager");
 const QLatin1String registrationInterface("org.ofono.NetworkRegistration");
+const QLatin1String radioInterface("org.ofono.RadioSettings");
+const QLatin1String connectionInterface("org.ofono.ConnectionManager");
 const QLatin1String simInfoInterface("org.veldmobile.ofono.SimInfo");
 
 const QLatin1String poweredProperty("Powered");
 const QLatin1String onlineProperty("Online");
+const QLatin1String technologyPreference("TechnologyPreference");
 
 const QLatin1String cardIdentifier("CardIdentifier");
 const QLatin1String serviceProviderName("ServiceProviderName");
@@ -30,7 +35,19 @@ constexpr quint8 signalStrength = 70; // percent
 
 } // namespace
 
-Modem::Modem(std::size_t slot, const Sim &sim, const QJsonObject &slotProfile, std::function<void()> changed)
+QStringList Modem::technologiesOf(const QJsonObject &slotProfile)
+{
+    const QJsonValue listed = slotProfile.value(QLatin1String("technologies"));
+    if (!listed.isArray())
+        return {QStringLiteral("gsm"), QStringLiteral("umts"), QStringLiteral("lte")};
+    QStringList technologies;
+    for (const QJsonValue &technology : listed.toArray())
+        technologies << technology.toString();
+    return technologies;
+}
+
+Modem::Modem(std::size_t slot, const Sim &sim, const QJsonObject &slotProfile, ContextStore &contexts,
+             std::function<void()> changed)
     : m_slot(slot)
     , m_path(QStringLiteral("/ril_%1").arg(slot))
     , m_sim(sim)
@@ -39,6 +56,9 @@ Modem::Modem(std::size_t slot, const Sim &sim, const QJsonObject &slotProfile, s
     , m_isPowered(m_isEnabled)
     , m_isOnline(m_isEnabled)
     , m_registration(slotProfile.value(QLatin1String("registration")).toString(QStringLiteral("registered")))
+    , m_technologies(technologiesOf(slotProfile))
+    , m_technologyPreference(slotProfile.value(QLatin1String("technologyPreference")).toString(anyTechnology))
+    , m_mobileData(m_path, contexts, m_changed)
 {
     // What the card brings comes before what the network makes of it.
     addInterface(simInterface, &Modem::hasSim, &Modem::simProperties);
@@ -48,6 +68,12 @@ Modem::Modem(std::size_t slot, const Sim &sim, const QJsonObject &slotProfile, s
                        setProperty(call);
                    }}});
     addInterface(registrationInterface, &Modem::hasRegistration, &Modem::registrationProperties);
+    addInterface(radioInterface, &Modem::hasUsableSim, &Modem::radioProperties,
+                 {{QStringLiteral("SetProperty"), [this](MethodCall &call) {
+                       setRadioProperty(call);
+                   }}});
+    addInterface(connectionInterface, &Modem::hasUsableSim, &Modem::connectionProperties,
+                 m_mobileData.methods());
 }
 
 void Modem::addInterface(QLatin1String name, bool (Modem::*isOffered)() const,
@@ -78,10 +104,27 @@ void Modem::addSimInfo()
 void Modem::attach(Service &service)
 {
     m_service = &service;
+    followSim();
     for (Interface &interface : m_interfaces) {
         interface.isOnBus = false;
         setOnBus(interface);
     }
+    m_mobileData.attach(service);
+}
+
+void Modem::detach()
+{
+    m_mobileData.detach();
+    m_service = nullptr;
+}
+
+/** Lets mobile data know what SIM and what network there are now. */
+void Modem::followSim()
+{
+    const QString status = hasRegistration() ? registration() : QString();
+    const bool isRoaming = status == QLatin1String("roaming");
+    m_mobileData.setSim(hasUsableSim() ? m_sim.imsi : QString());
+    m_mobileData.setServed(status == QLatin1String("registered") || isRoaming, isRoaming);
 }
 
 /** Puts @p interface on the bus or takes it off, as it is now; what it tells then needs no announcement. */
@@ -101,11 +144,13 @@ void Modem::setOnBus(Interface &interface)
 
 void Modem::announce()
 {
+    followSim();
     if (!m_service)
         return;
     // Who hears of an interface finds it.
     for (Interface &interface : m_interfaces)
         setOnBus(interface);
+    m_mobileData.announce();
     for (Interface &interface : m_interfaces) {
         if (!interface.isOnBus)
             continue;
@@ -146,6 +191,8 @@ QStringList Modem::features() const
     QStringList features;
     if (hasRegistration())
         features << QStringLiteral("net");
+    if (hasUsableSim())
+        features << QStringLiteral("rat") << QStringLiteral("gprs");
     if (hasSim() && m_sim.present)
         features << QStringLiteral("sim");
     return features;
@@ -224,16 +271,48 @@ Properties Modem::registrationProperties() const
     return properties;
 }
 
+CellularLinks::Links Modem::links() const
+{
+    CellularLinks::Links links;
+    if (!m_mobileData.isAttached())
+        return links;
+    const bool isRoaming = registration() == QLatin1String("roaming");
+    for (const ConnectionContext &context : m_mobileData.contexts()) {
+        if (context.isForInternet())
+            links.push_back({m_path + QLatin1Char('/') + context.name, m_sim.imsi, m_sim.provider, isRoaming,
+                             context.isActive});
+    }
+    return links;
+}
+
+Properties Modem::radioProperties() const
+{
+    return {
+        {technologyPreference, fromText(m_technologyPreference)},
+        {QStringLiteral("AvailableTechnologies"), fromList(m_technologies)},
+    };
+}
+
+void Modem::setRadioProperty(MethodCall &call)
+{
+    const Ofono::PropertyRequest request(call);
+    if (request.name() != technologyPreference)
+        throw request.unknown();
+    const QString wanted = request.text();
+    if (wanted != anyTechnology && !m_technologies.contains(wanted))
+        throw Ofono::invalidArguments(QStringLiteral("The modem has no technology \"%1\"").arg(wanted));
+    call.reply();
+    m_technologyPreference = wanted;
+    m_changed();
+}
+
 void Modem::setProperty(MethodCall &call)
 {
-    const QString name = call.text(0);
+    const Ofono::PropertyRequest request(call);
+    const QString name = request.name();
     if (name != poweredProperty && name != onlineProperty)
-        throw Ofono::invalidArguments(QStringLiteral("There is no property %1 that could be set").arg(name));
-    Variant value(g_variant_get_child_value(call.arguments(), 1));
-    value = Variant(g_variant_get_variant(value.get()));
-    if (!g_variant_is_of_type(value.get(), G_VARIANT_TYPE_BOOLEAN))
-        throw Ofono::invalidArguments(QStringLiteral("%1 is a boolean").arg(name));
-    const bool wanted = g_variant_get_boolean(value.get());
+        throw request.unknown();
+    const bool wanted = request.flag();
     if (name == onlineProperty && wanted && !m_isPowered)
         throw Ofono::notAvailable(QStringLiteral("The modem is not powered"));
     call.reply();
@@ -259,9 +338,15 @@ void Modem::setEnabled(bool enabled)
 QJsonObject Modem::describe() const
 {
     return {
-        {QStringLiteral("path"), m_path},         {QStringLiteral("there"), m_isThere},
-        {QStringLiteral("enabled"), m_isEnabled}, {QStringLiteral("powered"), m_isPowered},
-        {QStringLiteral("online"), m_isOnline},   {QStringLiteral("registration"), registration()},
+        {QStringLiteral("path"), m_path},
+        {QStringLiteral("there"), m_isThere},
+        {QStringLiteral("enabled"), m_isEnabled},
+        {QStringLiteral("powered"), m_isPowered},
+        {QStringLiteral("online"), m_isOnline},
+        {QStringLiteral("registration"), registration()},
+        {QStringLiteral("technologyPreference"), m_technologyPreference},
+        {QStringLiteral("attached"), m_mobileData.isAttached()},
+        {QStringLiteral("accessPoints"), m_mobileData.describe()},
     };
 }
 

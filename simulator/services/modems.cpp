@@ -61,6 +61,7 @@ class Modems : public Component
 {
 public:
     Modems(const QJsonObject &profile, Phone &phone);
+    ~Modems() override;
 
     void attach(Service &service) override;
     void detach() override;
@@ -69,6 +70,8 @@ public:
 
 private:
     void announce();
+    void offerLinks();
+    bool switchContext(const QString &contextPath, bool isActive);
     QString lockSim(const QStringList &arguments);
     QString changeSim(const QString &slotText, const std::function<void(Sim &)> &change);
     QString chooseSim(const QStringList &arguments);
@@ -78,18 +81,20 @@ private:
 
     Phone &m_phone;
     const SimTray m_tray;
+    ContextStore m_contexts;
     ModemList m_modems; ///< by slot
     ModemManager m_manager;
     Service *m_service = nullptr;
 };
 
-ModemList createModems(const QJsonObject &profile, const Phone &phone, const std::function<void()> &changed)
+ModemList createModems(const QJsonObject &profile, const Phone &phone, ContextStore &contexts,
+                       const std::function<void()> &changed)
 {
     ModemList modems;
     const QJsonArray slotProfiles = profile.value(QLatin1String("sims")).toArray();
     for (std::size_t slot = 0; slot < phone.sims.size(); ++slot) {
-        modems.push_back(
-            std::make_unique<Modem>(slot, phone.sims[slot], slotProfiles.at(int(slot)).toObject(), changed));
+        modems.push_back(std::make_unique<Modem>(slot, phone.sims[slot],
+                                                 slotProfiles.at(int(slot)).toObject(), contexts, changed));
     }
     return modems;
 }
@@ -97,11 +102,25 @@ ModemList createModems(const QJsonObject &profile, const Phone &phone, const std
 Modems::Modems(const QJsonObject &profile, Phone &phone)
     : m_phone(phone)
     , m_tray(phone, [this](std::size_t) { announce(); })
-    , m_modems(createModems(profile, phone, [this] { announce(); }))
+    , m_contexts(profile.value(QLatin1String("sims")).toArray())
+    , m_modems(createModems(profile, phone, m_contexts, [this] { announce(); }))
     , m_manager(m_modems, profile.value(QLatin1String("telephony")).toObject(), [this] { announce(); })
 {
+    m_phone.cellularLinks.setActivator(
+        [this](const QString &contextPath, bool isActive) { return switchContext(contextPath, isActive); });
+    m_phone.cellularLinks.watchFlightMode([this](bool isOn) {
+        for (const std::unique_ptr<Modem> &modem : m_modems)
+            modem->setOnline(!isOn);
+        announce();
+    });
     for (const std::unique_ptr<Modem> &modem : m_modems)
         modem->setExtended(m_manager.isOffered());
+}
+
+Modems::~Modems()
+{
+    m_phone.cellularLinks.setActivator(nullptr);
+    m_phone.cellularLinks.watchFlightMode(nullptr);
 }
 
 void Modems::attach(Service &service)
@@ -125,6 +144,7 @@ void Modems::attach(Service &service)
     for (const std::unique_ptr<Modem> &modem : m_modems)
         modem->attach(service);
     m_manager.attach(service);
+    offerLinks();
 }
 
 void Modems::detach()
@@ -133,6 +153,7 @@ void Modems::detach()
         modem->detach();
     m_manager.detach();
     m_service = nullptr;
+    offerLinks();
 }
 
 /** Makes every interface tell what has changed. */
@@ -143,6 +164,36 @@ void Modems::announce()
         modem->announce();
     // A default SIM is one whose IMSI has been told.
     m_manager.announceDefaults();
+    offerLinks();
+}
+
+/** Tells the connection manager what it can make networks of. */
+void Modems::offerLinks()
+{
+    CellularLinks::Links links;
+    for (const std::unique_ptr<Modem> &modem : m_modems) {
+        const CellularLinks::Links ofModem = m_service ? modem->links() : CellularLinks::Links();
+        links.insert(links.end(), ofModem.begin(), ofModem.end());
+    }
+    m_phone.cellularLinks.offer(links);
+}
+
+/** As the connection manager does. */
+bool Modems::switchContext(const QString &contextPath, bool isActive)
+{
+    const int nameBegins = contextPath.lastIndexOf(QLatin1Char('/')) + 1;
+    for (const std::unique_ptr<Modem> &modem : m_modems) {
+        if (!m_service || modem->path() != contextPath.left(nameBegins - 1))
+            continue;
+        try {
+            modem->mobileData().activate(contextPath.mid(nameBegins), isActive);
+        } catch (const MethodError &) {
+            return false;
+        }
+        announce();
+        return true;
+    }
+    return false;
 }
 
 void Modems::describe(QJsonObject &state) const
@@ -323,6 +374,14 @@ QString problemOf(const QJsonObject &profile)
                 .arg(slot);
         }
         seen.insert(imsi);
+
+        const QString preference = sim.value(QLatin1String("technologyPreference")).toString();
+        if (!preference.isEmpty() && preference != Modem::anyTechnology
+            && !Modem::technologiesOf(sim).contains(preference)) {
+            return QStringLiteral("/sims/%1/technologyPreference: the slot's technologies are without %2")
+                .arg(slot)
+                .arg(preference);
+        }
     }
 
     const QJsonObject telephony = profile.value(QLatin1String("telephony")).toObject();

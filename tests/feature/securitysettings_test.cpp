@@ -22,11 +22,9 @@ namespace
 {
 
 const QString DeviceLockService = QStringLiteral("org.veldmobile.devicelock");
-const QString PackageService = QStringLiteral("org.freedesktop.PackageKit");
 const QString ManagementPath = QStringLiteral("/mdm");
 const QString ChangeSetting = QStringLiteral("ChangeSetting");
 const QString SettingsFile = QStringLiteral("/usr/share/dapple/devicelock/devicelock_settings.conf");
-const QString DeveloperProgram = QStringLiteral("/usr/bin/devel-su");
 
 const QString fetchFailed = QStringLiteral("Unable to fetch sideloading key ");
 const QString changeFailed = QStringLiteral("Failed to change sideloading state QDBusError(\"");
@@ -65,11 +63,6 @@ private Q_SLOTS:
     void sideloadingWithoutTheDaemon();
     void connectionIsMadeWhenItIsNeeded();
 
-    void developerModeThatIsThereAlready();
-    void developerModeIsInstalledAndRemoved();
-    void developerModeFails();
-    void developerModeWithoutPackageKit();
-    void objectDiesDuringAnInstallation();
     void otherPackagesAreIgnored();
 
 private:
@@ -88,7 +81,6 @@ void SecuritySettingsTest::cleanup()
 {
     m_phone->clearFaults();
     m_phone->startService(DeviceLockService);
-    m_phone->startService(PackageService);
     writeSettings(m_settings);
 }
 
@@ -253,83 +245,6 @@ void SecuritySettingsTest::connectionIsMadeWhenItIsNeeded()
     QVERIFY(first > 0);
     QVERIFY(settings.setSideloadingAllowed(false));
     QCOMPARE(highest(), first);
-}
-
-void SecuritySettingsTest::developerModeThatIsThereAlready()
-{
-    SecuritySettings settings;
-    SignalSequence seen(&settings);
-    QVERIFY(!settings.developerModeEnabled());
-    settings.setDeveloperModeEnabled(false);
-    m_phone->settle(PackageService);
-    QCOMPARE(m_phone->takeJournal(PackageService), QStringList());
-    QCOMPARE(seen.take(), QStringList());
-
-    QFile program(DeveloperProgram);
-    QVERIFY(program.open(QIODevice::WriteOnly));
-    program.close();
-    QVERIFY(settings.developerModeEnabled());
-    settings.setDeveloperModeEnabled(true);
-    m_phone->settle(PackageService);
-    QCOMPARE(m_phone->takeJournal(PackageService), QStringList());
-    QCOMPARE(seen.take(), QStringList());
-    QVERIFY(program.remove());
-}
-
-void SecuritySettingsTest::developerModeIsInstalledAndRemoved()
-{
-    SecuritySettings settings;
-    SignalSequence seen(&settings);
-    settings.setDeveloperModeEnabled(true);
-    QCOMPARE(seen.take(), QStringList());
-    QVERIFY(seen.waitFor(1));
-    QCOMPARE(seen.take(), QStringList(QStringLiteral("developerModeEnabledChanged()")));
-    QVERIFY(settings.developerModeEnabled());
-    QVERIFY(!m_phone->takeJournal(PackageService).filter(QStringLiteral("InstallPackages")).isEmpty());
-
-    settings.setDeveloperModeEnabled(false);
-    QVERIFY(seen.waitFor(1));
-    QCOMPARE(seen.take(), QStringList(QStringLiteral("developerModeEnabledChanged()")));
-    QVERIFY(!settings.developerModeEnabled());
-    // What came along with it goes, too: the last argument but none.
-    const QStringList removals
-        = m_phone->takeJournal(PackageService).filter(QStringLiteral("RemovePackages"));
-    QCOMPARE(removals.size(), 1);
-    QVERIFY2(removals.first().contains(QStringLiteral("tevrik-developer-mode;"))
-                 && removals.first().endsWith(QStringLiteral(", true)")),
-             qPrintable(removals.first()));
-}
-
-void SecuritySettingsTest::developerModeFails()
-{
-    m_phone->failCalls(PackageService, QString(), QStringLiteral("CreateTransaction"),
-                       QStringLiteral("com.example.Broken"), QString());
-    SecuritySettings settings;
-    SignalSequence seen(&settings);
-    settings.setDeveloperModeEnabled(true);
-    QVERIFY(seen.waitFor(1));
-    QCOMPARE(seen.take(), QStringList(QStringLiteral("developerModeChangeError()")));
-    QVERIFY(!settings.developerModeEnabled());
-}
-
-void SecuritySettingsTest::developerModeWithoutPackageKit()
-{
-    m_phone->stopService(PackageService);
-    SecuritySettings settings;
-    SignalSequence seen(&settings);
-    settings.setDeveloperModeEnabled(true);
-    QVERIFY(seen.waitFor(1));
-    QCOMPARE(seen.take(), QStringList(QStringLiteral("developerModeChangeError()")));
-}
-
-void SecuritySettingsTest::objectDiesDuringAnInstallation()
-{
-    m_phone->swallowCalls(PackageService, QString(), QStringLiteral("CreateTransaction"));
-    auto settings = std::make_unique<SecuritySettings>();
-    SignalSequence seen(settings.get());
-    settings->setDeveloperModeEnabled(true);
-    settings.reset();
-    QCOMPARE(seen.take(), QStringList());
 }
 
 void SecuritySettingsTest::otherPackagesAreIgnored()

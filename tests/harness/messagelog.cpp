@@ -1,6 +1,8 @@
 // SPDX-License-Identifier: LGPL-2.1-or-later
 #include "messagelog.h"
 
+#include <utility>
+
 MessageLog *MessageLog::s_current = nullptr;
 
 MessageLog::MessageLog()
@@ -18,15 +20,20 @@ MessageLog::~MessageLog()
 
 QStringList MessageLog::takeWarnings()
 {
-    QStringList warnings;
-    warnings.swap(m_warnings);
-    return warnings;
+    return std::exchange(m_warnings, {});
+}
+
+QStringList MessageLog::takeInfos()
+{
+    return std::exchange(m_infos, {});
 }
 
 void MessageLog::handle(QtMsgType type, const QMessageLogContext &context, const QString &message)
 {
     if (type == QtWarningMsg)
         s_current->m_warnings.append(message);
+    else if (type == QtInfoMsg)
+        s_current->m_infos.append(message);
     else
         s_current->m_previous(type, context, message);
 }

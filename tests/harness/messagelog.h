@@ -14,6 +14,8 @@ public:
 
     /** Warnings since construction or the last call, oldest first. */
     QStringList takeWarnings();
+    /** The same of what is worth knowing, but no problem. */
+    QStringList takeInfos();
 
 private:
     Q_DISABLE_COPY(MessageLog)
@@ -23,6 +25,7 @@ private:
     static MessageLog *s_current;
     QtMessageHandler m_previous;
     QStringList m_warnings;
+    QStringList m_infos;
 };
 
 #endif // CORVANE_TEST_MESSAGELOG_H

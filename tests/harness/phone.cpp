@@ -73,6 +73,23 @@ void Phone::failCalls(const QString &service, const QString &path, const QString
              {{QStringLiteral("error"), error}, {QStringLiteral("message"), message}});
 }
 
+void Phone::failCall(int number, const QString &service, const QString &path, const QString &member,
+                     const QString &error, const QString &message)
+{
+    setFault(service, path, member, QStringLiteral("error"),
+             {{QStringLiteral("error"), error},
+              {QStringLiteral("message"), message},
+              {QStringLiteral("times"), 1u}});
+    letCallsPass(number - 1, service, path, member);
+}
+
+void Phone::letCallsPass(int count, const QString &service, const QString &path, const QString &member)
+{
+    if (count > 0)
+        setFault(service, path, member, QStringLiteral("late"),
+                 {{QStringLiteral("delay"), 0u}, {QStringLiteral("times"), uint(count)}});
+}
+
 void Phone::answerCalls(const QString &service, const QString &path, const QString &member,
                         const QVariantList &arguments)
 {
@@ -119,22 +136,28 @@ void Phone::settle(const QString &service)
 
 QStringList Phone::takeJournal(const QString &service)
 {
-    return takeJournal(service, false);
+    return takeJournal(QStringList(service), false);
+}
+
+QStringList Phone::takeJournal(const QStringList &services)
+{
+    return takeJournal(services, false);
 }
 
 QStringList Phone::takeJournalWithInterfaces(const QString &service)
 {
-    return takeJournal(service, true);
+    return takeJournal(QStringList(service), true);
 }
 
-QStringList Phone::takeJournal(const QString &service, bool withInterfaces)
+QStringList Phone::takeJournal(const QStringList &services, bool withInterfaces)
 {
     QList<JournalEntry> journal;
     qvariant_cast<QDBusArgument>(control(QStringLiteral("Journal"), {m_journalPosition}).first()) >> journal;
     QStringList calls;
     for (const JournalEntry &entry : qAsConst(journal)) {
         m_journalPosition = entry.number;
-        if (entry.service != service || entry.interface.startsWith(QLatin1String("org.freedesktop.DBus")))
+        if (!services.contains(entry.service)
+            || entry.interface.startsWith(QLatin1String("org.freedesktop.DBus")))
             continue;
         const QString member
             = withInterfaces ? entry.interface + QLatin1Char('.') + entry.member : entry.member;

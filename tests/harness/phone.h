@@ -23,6 +23,14 @@ public:
     /** @p member fails with @p error from now on; an empty @p path stands for any. */
     void failCalls(const QString &service, const QString &path, const QString &member, const QString &error,
                    const QString &message);
+    /**
+     * Only the call with @p number, from 1, fails of those of @p member. Of faults for the same calls,
+     * the one that was set last comes first, and the others once it is used up.
+     */
+    void failCall(int number, const QString &service, const QString &path, const QString &member,
+                  const QString &error, const QString &message);
+    /** So many calls of @p member are answered as they should be, whatever was set before. */
+    void letCallsPass(int count, const QString &service, const QString &path, const QString &member);
     /** @p member is answered with @p arguments from now on. */
     void answerCalls(const QString &service, const QString &path, const QString &member,
                      const QVariantList &arguments);
@@ -48,6 +56,8 @@ public:
     /** Calls received since construction or the last call, as "path member arguments"; without introspection.
      */
     QStringList takeJournal(const QString &service);
+    /** The same of several services, in the order in which they received them. */
+    QStringList takeJournal(const QStringList &services);
     /** The same as "path interface.member arguments". */
     QStringList takeJournalWithInterfaces(const QString &service);
 
@@ -56,7 +66,7 @@ public:
     QJsonObject state() const;
 
 private:
-    QStringList takeJournal(const QString &service, bool withInterfaces);
+    QStringList takeJournal(const QStringList &services, bool withInterfaces);
     void ping(const QString &service) const;
     QVariantList control(const QString &method, const QVariantList &arguments = QVariantList()) const;
     void setFault(const QString &service, const QString &path, const QString &member, const QString &kind,

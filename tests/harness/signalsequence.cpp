@@ -33,6 +33,25 @@ template <typename T> QString text(const QList<T> &list)
     return QLatin1Char('[') + texts.join(QLatin1Char(' ')) + QLatin1Char(']');
 }
 
+QString text(const QVariant &value);
+
+QString text(const QVariantMap &map)
+{
+    QStringList texts;
+    for (auto member = map.begin(); member != map.end(); ++member)
+        texts.append(member.key() + QLatin1Char('=') + text(member.value()));
+    return QLatin1Char('{') + texts.join(QLatin1Char(' ')) + QLatin1Char('}');
+}
+
+QString text(const QVariant &value)
+{
+    if (value.userType() == QMetaType::QVariantMap)
+        return text(value.toMap());
+    if (value.userType() == QMetaType::QStringList)
+        return value.toStringList().join(QLatin1Char(' '));
+    return value.toString();
+}
+
 QString text(int type, const void *value)
 {
     if (type == qMetaTypeId<SimFilter::Rule>())
@@ -45,7 +64,7 @@ QString text(int type, const void *value)
         return simStateText(*static_cast<const SimInfo::SimState *>(value));
     if (type == QMetaType::UnknownType)
         return QStringLiteral("<type unknown to the meta-object system>");
-    return QVariant(type, value).toString();
+    return text(QVariant(type, value));
 }
 
 } // namespace

@@ -80,11 +80,12 @@ void ModemsServiceTest::cleanup()
 void ModemsServiceTest::listsAModemASlot()
 {
     const QString interfaces
-        = QStringLiteral("org.ofono.SimManager, org.veldmobile.ofono.SimInfo, org.ofono.NetworkRegistration");
+        = QStringLiteral("org.ofono.SimManager, org.veldmobile.ofono.SimInfo, org.ofono.NetworkRegistration, "
+                         "org.ofono.RadioSettings, org.ofono.ConnectionManager");
     const QString first = QStringLiteral("{Powered=<true>, Online=<true>, Lockdown=<false>, "
                                          "Emergency=<false>, Name=<Slot 0>, Manufacturer=<Corvane>, "
                                          "Model=<Simulated modem>, Revision=<1.0>, Serial=<358240051111100>, "
-                                         "Type=<hardware>, Features=<[net, sim]>, "
+                                         "Type=<hardware>, Features=<[net, rat, gprs, sim]>, "
                                          "Interfaces=<[%1]>}")
                               .arg(interfaces);
     QString second = first;
@@ -125,13 +126,15 @@ void ModemsServiceTest::switchesPower()
     QCOMPARE(set(QStringLiteral("Online"), true), done);
     QCOMPARE(takeSignals(),
              (QStringList{QStringLiteral("PropertyChanged(Powered, <true>)"),
-                          QStringLiteral("PropertyChanged(Features, <[sim]>)"),
+                          QStringLiteral("PropertyChanged(Features, <[rat, gprs, sim]>)"),
                           QStringLiteral("PropertyChanged(Interfaces, <[org.ofono.SimManager, "
-                                         "org.veldmobile.ofono.SimInfo]>)"),
+                                         "org.veldmobile.ofono.SimInfo, org.ofono.RadioSettings, "
+                                         "org.ofono.ConnectionManager]>)"),
                           QStringLiteral("PropertyChanged(Online, <true>)"),
-                          QStringLiteral("PropertyChanged(Features, <[net, sim]>)"),
+                          QStringLiteral("PropertyChanged(Features, <[net, rat, gprs, sim]>)"),
                           QStringLiteral("PropertyChanged(Interfaces, <[org.ofono.SimManager, "
-                                         "org.veldmobile.ofono.SimInfo, org.ofono.NetworkRegistration]>)")}));
+                                         "org.veldmobile.ofono.SimInfo, org.ofono.NetworkRegistration, "
+                                         "org.ofono.RadioSettings, org.ofono.ConnectionManager]>)")}));
     QCOMPARE(call(simInterface, getProperties), simProperties);
 }
 
@@ -142,13 +145,15 @@ void ModemsServiceTest::switchesOnline()
     QCOMPARE(set(QStringLiteral("Online"), true), done);
     QCOMPARE(takeSignals(),
              (QStringList{QStringLiteral("PropertyChanged(Online, <false>)"),
-                          QStringLiteral("PropertyChanged(Features, <[sim]>)"),
+                          QStringLiteral("PropertyChanged(Features, <[rat, gprs, sim]>)"),
                           QStringLiteral("PropertyChanged(Interfaces, <[org.ofono.SimManager, "
-                                         "org.veldmobile.ofono.SimInfo]>)"),
+                                         "org.veldmobile.ofono.SimInfo, org.ofono.RadioSettings, "
+                                         "org.ofono.ConnectionManager]>)"),
                           QStringLiteral("PropertyChanged(Online, <true>)"),
-                          QStringLiteral("PropertyChanged(Features, <[net, sim]>)"),
+                          QStringLiteral("PropertyChanged(Features, <[net, rat, gprs, sim]>)"),
                           QStringLiteral("PropertyChanged(Interfaces, <[org.ofono.SimManager, "
-                                         "org.veldmobile.ofono.SimInfo, org.ofono.NetworkRegistration]>)")}));
+                                         "org.veldmobile.ofono.SimInfo, org.ofono.NetworkRegistration, "
+                                         "org.ofono.RadioSettings, org.ofono.ConnectionManager]>)")}));
 }
 
 void ModemsServiceTest::refusesOtherProperties()
@@ -168,7 +173,9 @@ void ModemsServiceTest::pullsAndInsertsTheSim()
     QCOMPARE(call(simInterface, getProperties), QStringLiteral("reply({Present=<false>})"));
     QCOMPARE(takeSignals(),
              (QStringList{QStringLiteral("PropertyChanged(Present, <false>)"),
-                          QStringLiteral("PropertyChanged(Features, <[net]>)")}));
+                          QStringLiteral("PropertyChanged(Features, <[net]>)"),
+                          QStringLiteral("PropertyChanged(Interfaces, <[org.ofono.SimManager, "
+                                         "org.veldmobile.ofono.SimInfo, org.ofono.NetworkRegistration]>)")}));
 
     QCOMPARE(act(insert, {slot}), QStringLiteral("reply(The SIM 262021234567891 is in slot 1)"));
     QCOMPARE(call(simInterface, getProperties), simProperties);
@@ -181,7 +188,10 @@ void ModemsServiceTest::pullsAndInsertsTheSim()
                           QStringLiteral("PropertyChanged(MobileCountryCode, <262>)"),
                           QStringLiteral("PropertyChanged(MobileNetworkCode, <02>)"),
                           QStringLiteral("PropertyChanged(SubscriberIdentity, <262021234567891>)"),
-                          QStringLiteral("PropertyChanged(Features, <[net, sim]>)")}));
+                          QStringLiteral("PropertyChanged(Features, <[net, rat, gprs, sim]>)"),
+                          QStringLiteral("PropertyChanged(Interfaces, <[org.ofono.SimManager, "
+                                         "org.veldmobile.ofono.SimInfo, org.ofono.NetworkRegistration, "
+                                         "org.ofono.RadioSettings, org.ofono.ConnectionManager]>)")}));
 }
 
 void ModemsServiceTest::takesAnotherSim()

@@ -2,6 +2,7 @@
 // Uses every public class from outside of the project. Where no service answers, it must work as well.
 #include <corvanemdm/applications.h>
 #include <corvanemdm/callstatistics.h>
+#include <corvanemdm/connectivitysettings.h>
 #include <corvanemdm/corvanemdm_global.h>
 #include <corvanemdm/devicelock.h>
 #include <corvanemdm/locationinfo.h>
@@ -44,6 +45,17 @@ bool simInfoWorks()
     // Nothing is known before the event loop has run.
     return !info.available() && info.simSlotStates().isEmpty() && text.contains(QLatin1String("roaming"))
         && QString(slot) == QLatin1String("Slot(1) = (x)");
+}
+
+bool connectivitySettingsWork()
+{
+    ConnectivitySettings settings;
+    QObject::connect(&settings, &ConnectivitySettings::wlanEnabledChanged, &settings, [] {});
+    const ConnectivitySettings mirror(ConnectivitySettings::NetworkManagerMode);
+    ConnectivitySettings::MobileNetworkAccessPointSettings accessPoint;
+    const auto twoAndThree = ConnectivitySettings::Technology2G | ConnectivitySettings::Technology3G;
+    return settings.ready() && !mirror.wlanEnabled() && int(twoAndThree) == 3 && !accessPoint.isValid()
+        && !settings.setAccessPointSettings(QStringLiteral("244120000000001"), accessPoint);
 }
 
 bool simVoiceCallFilterWorks()
@@ -146,8 +158,8 @@ int main(int argc, char **argv)
 {
     QCoreApplication application(argc, argv);
     const bool works = simFilterWorks() && simVoiceCallFilterWorks() && otherFiltersWork() && simInfoWorks()
-        && callStatisticsWork() && deviceLockWorks() && sysInfoWorks() && securitySettingsWork()
-        && applicationsWork() && notificationInfoWorks() && locationInfoWorks();
+        && connectivitySettingsWork() && callStatisticsWork() && deviceLockWorks() && sysInfoWorks()
+        && securitySettingsWork() && applicationsWork() && notificationInfoWorks() && locationInfoWorks();
     QTextStream(stdout) << (works ? "consumer works" : "consumer fails") << ", update: " << latestVersion()
                         << '\n';
     return works ? 0 : 1;
