@@ -126,10 +126,10 @@ void SecuritySettingsTest::sideloadingWithoutAnAnswer_data()
     QTest::newRow("no file") << QByteArray() << "desktop";
     QTest::newRow("no group") << QByteArray("[other]\nveld\\devicelock\\sideloading_allowed=1\n")
                               << "desktop";
-    QTest::newRow("text") << value("true") << "true";
-    QTest::newRow("number and text") << value("1 yes") << "1 yes";
+    QTest::newRow("text") << value("true") << "sideloading_allowed";
+    QTest::newRow("number and text") << value("1yes") << "sideloading_allowed";
     QTest::newRow("nothing") << value("") << "";
-    QTest::newRow("too large") << value("4294967297") << "4294967297";
+    QTest::newRow("too large") << value("4294967297") << "sideloading_allowed";
     QTest::newRow("not a key file") << QByteArray("sideloading\n") << "desktop";
 }
 
