@@ -18,6 +18,7 @@ struct Service {
 
     static Service telephony();
     static Service mdmProxy();
+    static Service connectionManager();
 
     /** "the telephony service (org.ofono)" */
     QString toString() const;
@@ -33,6 +34,9 @@ struct Service {
 
     /** The answer to everything that is asked of a service that is not there. */
     Reply notRunning() const;
+
+    /** "the telephony service (org.ofono) refused: @p reason" */
+    QString refusal(const QString &reason) const;
 };
 
 } // namespace Agent
