@@ -21,6 +21,9 @@ Command callStatisticsCommand();
 Command simCommand();
 Command wifiCommand();
 Command flightModeCommand();
+Command lockCommand();
+Command securityCommand();
+Command infoCommand();
 Command policyCommand();
 
 // Options that commands share.

@@ -33,9 +33,9 @@ Command program()
                                         "  1  refused or failed\n"
                                         "  2  wrong usage: nothing was sent\n"
                                         "  3  the service that it takes is not available");
-    mdmctl.commands = {updateCommand(), callsCommand(), smsCommand(),        dataCommand(),
-                       simCommand(),    wifiCommand(),  flightModeCommand(), callStatisticsCommand(),
-                       policyCommand()};
+    mdmctl.commands = {updateCommand(), callsCommand(),    smsCommand(),        dataCommand(),
+                       simCommand(),    wifiCommand(),     flightModeCommand(), callStatisticsCommand(),
+                       lockCommand(),   securityCommand(), infoCommand(),       policyCommand()};
     mdmctl.commands.append(completionCommand(mdmctl));
     return mdmctl;
 }

@@ -1,8 +1,10 @@
 // SPDX-License-Identifier: LGPL-2.1-or-later
 #include "policysections.h"
 
+#include "devicelocksection.h"
 #include "radiosection.h"
 #include "rulesection.h"
+#include "securitysection.h"
 #include "softwareupdatesection.h"
 
 namespace Corvane
@@ -17,6 +19,8 @@ PolicySections makePolicySections(const Timeouts &timeouts)
         sections.push_back(std::make_unique<RuleSection>(family, timeouts.confirmation));
     for (const Radio radio : {Radio::FlightMode, Radio::WiFi})
         sections.push_back(std::make_unique<RadioSection>(radio, timeouts.confirmation));
+    sections.push_back(std::make_unique<DeviceLockSection>(timeouts.confirmation));
+    sections.push_back(std::make_unique<SecuritySection>(timeouts.silence));
     sections.push_back(std::make_unique<SoftwareUpdateSection>(timeouts.silence));
     return sections;
 }

@@ -27,6 +27,21 @@ Service Service::connectionManager()
     return {QStringLiteral("net.connman"), QStringLiteral("connection manager")};
 }
 
+Service Service::packageKit()
+{
+    return {QStringLiteral("org.freedesktop.PackageKit"), QStringLiteral("package manager")};
+}
+
+Service Service::deviceLock()
+{
+    return {QStringLiteral("org.veldmobile.devicelock"), QStringLiteral("device-lock daemon")};
+}
+
+Service Service::bus()
+{
+    return {QStringLiteral("org.freedesktop.DBus"), QStringLiteral("system bus")};
+}
+
 QString Service::toString() const
 {
     return QStringLiteral("the %1 (%2)").arg(description, name);

@@ -18,6 +18,10 @@ struct Service {
 
     static Service telephony();
     static Service mdmProxy();
+    static Service packageKit();
+    static Service deviceLock();
+    /** The bus itself, which answers for services that come and go. */
+    static Service bus();
     static Service connectionManager();
 
     /** "the telephony service (org.ofono)" */
