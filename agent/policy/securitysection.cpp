@@ -28,7 +28,8 @@ QString SecuritySection::member() const
 
 Service SecuritySection::service() const
 {
-    return Service::packageKit();
+    // Looking needs nobody; the package manager is called when there is something to change.
+    return Service::bus();
 }
 
 QString SecuritySection::fault(const QJsonObject &) const

@@ -29,7 +29,10 @@ Reply SecuritySwitches::setDeveloperMode(bool enabled)
     if (developerMode() == enabled)
         return {};
     const Service packages = Service::packageKit();
-    // The bus starts it when it is needed, and it goes when it is not.
+    const Reply running = packages.ensureRunning();
+    if (!running.isDone())
+        return running;
+    // It goes from the bus when it has nothing to do.
     Wait wait(Service::bus(), m_timeout,
               enabled ? QStringLiteral("install developer mode") : QStringLiteral("remove developer mode"));
     connect(&m_settings, &SecuritySettings::developerModeEnabledChanged, &wait,
