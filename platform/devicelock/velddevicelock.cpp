@@ -3,6 +3,7 @@
 
 #include <devicelock/velddbusconnection.h>
 
+#include <QtCore/QPointer>
 #include <QtDBus/QDBusMessage>
 #include <QtDBus/QDBusPendingCallWatcher>
 #include <QtDBus/QDBusPendingReply>
@@ -72,8 +73,11 @@ private Q_SLOTS:
 private:
     void reconnect()
     {
-        answer.reset();
-        connection.reconnect(newPeer());
+        // What the daemon before this one told is worth nothing, also when its end has not been noticed.
+        const QPointer<Private> alive(this);
+        forget();
+        if (alive)
+            connection.reconnect(newPeer());
     }
 
     void follow()
