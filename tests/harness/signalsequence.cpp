@@ -4,10 +4,13 @@
 #include "waiting.h"
 
 #include <corvanemdm/callstatistics.h>
+#include <corvanemdm/certificates.h>
 #include <corvanemdm/simfilter.h>
 #include <corvanemdm/siminfo.h>
 
 using Corvane::Mdm::CallStatistics;
+using Corvane::Mdm::CertificateFile;
+using Corvane::Mdm::Certificates;
 using Corvane::Mdm::SimFilter;
 using Corvane::Mdm::SimInfo;
 
@@ -62,6 +65,10 @@ QString text(int type, const void *value)
         return text(*static_cast<const QList<CallStatistics::Result> *>(value));
     if (type == qMetaTypeId<SimInfo::SimState>())
         return simStateText(*static_cast<const SimInfo::SimState *>(value));
+    if (type == qMetaTypeId<CertificateFile>())
+        return static_cast<const CertificateFile *>(value)->fileName();
+    if (type == qMetaTypeId<Certificates::Result>())
+        return QString::number(*static_cast<const Certificates::Result *>(value));
     if (type == QMetaType::UnknownType)
         return QStringLiteral("<type unknown to the meta-object system>");
     return text(QVariant(type, value));
@@ -89,7 +96,8 @@ SignalSequence::SignalSequence(QObject *object)
 {
     const QMetaObject *metaObject = object->metaObject();
     const int firstSlot = QObject::staticMetaObject.methodCount();
-    for (int index = metaObject->methodOffset(); index < metaObject->methodCount(); ++index) {
+    // From all classes but QObject.
+    for (int index = firstSlot; index < metaObject->methodCount(); ++index) {
         const QMetaMethod method = metaObject->method(index);
         if (method.methodType() != QMetaMethod::Signal)
             continue;
