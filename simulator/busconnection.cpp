@@ -73,6 +73,83 @@ void MethodCall::fail(const MethodError &error)
     g_dbus_method_invocation_return_dbus_error(m_invocation, error.name().toUtf8().constData(), error.what());
 }
 
+ExportedObjects::ExportedObjects(GDBusConnection *connection)
+    : m_connection(connection)
+{
+}
+
+ExportedObjects::~ExportedObjects()
+{
+    for (const std::unique_ptr<Object> &object : m_objects)
+        g_dbus_connection_unregister_object(m_connection, object->registration);
+}
+
+void ExportedObjects::add(const QString &path, const QString &interface, MethodHandlers handlers,
+                          PropertyReaders properties)
+{
+    static const GDBusInterfaceVTable vtable = {
+        [](GDBusConnection *, const gchar *, const gchar *, const gchar *, const gchar *member, GVariant *,
+           GDBusMethodInvocation *invocation, gpointer data) {
+            const auto *object = static_cast<const Object *>(data);
+            MethodCall call(invocation);
+            try {
+                object->handlers.at(QString::fromUtf8(member))(call);
+            } catch (const MethodError &error) {
+                call.fail(error);
+            }
+        },
+        [](GDBusConnection *, const gchar *, const gchar *, const gchar *, const gchar *name, GError **,
+           gpointer data) {
+            return static_cast<const Object *>(data)->properties.at(QString::fromUtf8(name))();
+        },
+        nullptr,
+        {},
+    };
+
+    GDBusInterfaceInfo *contract = contractOf(interface);
+    for (GDBusMethodInfo **method = contract->methods; method && *method; ++method) {
+        if (!handlers.count(QString::fromUtf8((*method)->name)))
+            qFatal("%s at %s does not handle %s", qUtf8Printable(interface), qUtf8Printable(path),
+                   (*method)->name);
+    }
+    for (GDBusPropertyInfo **property = contract->properties; property && *property; ++property) {
+        if (!properties.count(QString::fromUtf8((*property)->name)))
+            qFatal("%s at %s has no %s", qUtf8Printable(interface), qUtf8Printable(path), (*property)->name);
+    }
+
+    auto object = std::make_unique<Object>();
+    object->path = path;
+    object->interface = interface;
+    object->handlers = std::move(handlers);
+    object->properties = std::move(properties);
+    ErrorSlot error;
+    object->registration = g_dbus_connection_register_object(
+        m_connection, path.toUtf8().constData(), contract, &vtable, object.get(), nullptr, &error);
+    if (error)
+        throw BusError(error->message);
+    m_objects.push_back(std::move(object));
+}
+
+void ExportedObjects::remove(const QString &path, const QString &interface)
+{
+    const auto found = std::find_if(m_objects.begin(), m_objects.end(), [&](const auto &object) {
+        return object->path == path && object->interface == interface;
+    });
+    if (found == m_objects.end())
+        return;
+    g_dbus_connection_unregister_object(m_connection, (*found)->registration);
+    m_objects.erase(found);
+}
+
+void emitSignalOver(GDBusConnection *connection, const QString &path, const QString &interface,
+                    const QString &member, GVariant *arguments, const QString &destination)
+{
+    g_dbus_connection_emit_signal(connection,
+                                  destination.isEmpty() ? nullptr : destination.toUtf8().constData(),
+                                  path.toUtf8().constData(), interface.toUtf8().constData(),
+                                  member.toUtf8().constData(), arguments, nullptr);
+}
+
 BusConnection::BusConnection()
     : m_lifetime(g_cancellable_new())
 {
@@ -84,6 +161,7 @@ BusConnection::BusConnection()
         nullptr, nullptr, &error));
     if (!m_connection)
         throw BusError(error->message);
+    m_objects = std::make_unique<ExportedObjects>(m_connection.get());
 }
 
 BusConnection::~BusConnection()
@@ -93,8 +171,7 @@ BusConnection::~BusConnection()
         g_dbus_connection_signal_unsubscribe(m_connection.get(), m_signalSubscription);
     if (m_nameSubscription)
         g_dbus_connection_signal_unsubscribe(m_connection.get(), m_nameSubscription);
-    for (const std::unique_ptr<Object> &object : m_objects)
-        g_dbus_connection_unregister_object(m_connection.get(), object->registration);
+    m_objects.reset();
     g_dbus_connection_close_sync(m_connection.get(), nullptr, nullptr);
 }
 
@@ -190,68 +267,18 @@ void BusConnection::watchSignal(const QString &service, const QString &member,
 void BusConnection::addObject(const QString &path, const QString &interface, MethodHandlers handlers,
                               PropertyReaders properties)
 {
-    static const GDBusInterfaceVTable vtable = {
-        [](GDBusConnection *, const gchar *, const gchar *, const gchar *, const gchar *member, GVariant *,
-           GDBusMethodInvocation *invocation, gpointer data) {
-            const auto *object = static_cast<const Object *>(data);
-            MethodCall call(invocation);
-            try {
-                object->handlers.at(QString::fromUtf8(member))(call);
-            } catch (const MethodError &error) {
-                call.fail(error);
-            }
-        },
-        [](GDBusConnection *, const gchar *, const gchar *, const gchar *, const gchar *name, GError **,
-           gpointer data) {
-            return static_cast<const Object *>(data)->properties.at(QString::fromUtf8(name))();
-        },
-        nullptr,
-        {},
-    };
-
-    GDBusInterfaceInfo *contract = contractOf(interface);
-    for (GDBusMethodInfo **method = contract->methods; method && *method; ++method) {
-        if (!handlers.count(QString::fromUtf8((*method)->name)))
-            qFatal("%s at %s does not handle %s", qUtf8Printable(interface), qUtf8Printable(path),
-                   (*method)->name);
-    }
-
-    for (GDBusPropertyInfo **property = contract->properties; property && *property; ++property) {
-        if (!properties.count(QString::fromUtf8((*property)->name)))
-            qFatal("%s at %s has no %s", qUtf8Printable(interface), qUtf8Printable(path), (*property)->name);
-    }
-
-    auto object = std::make_unique<Object>();
-    object->path = path;
-    object->interface = interface;
-    object->handlers = std::move(handlers);
-    object->properties = std::move(properties);
-    ErrorSlot error;
-    object->registration = g_dbus_connection_register_object(
-        m_connection.get(), path.toUtf8().constData(), contract, &vtable, object.get(), nullptr, &error);
-    if (error)
-        throw BusError(error->message);
-    m_objects.push_back(std::move(object));
+    m_objects->add(path, interface, std::move(handlers), std::move(properties));
 }
 
 void BusConnection::removeObject(const QString &path, const QString &interface)
 {
-    const auto found = std::find_if(m_objects.begin(), m_objects.end(), [&](const auto &object) {
-        return object->path == path && object->interface == interface;
-    });
-    if (found == m_objects.end())
-        return;
-    g_dbus_connection_unregister_object(m_connection.get(), (*found)->registration);
-    m_objects.erase(found);
+    m_objects->remove(path, interface);
 }
 
 void BusConnection::emitSignal(const QString &path, const QString &interface, const QString &member,
                                GVariant *arguments, const QString &destination) const
 {
-    g_dbus_connection_emit_signal(m_connection.get(),
-                                  destination.isEmpty() ? nullptr : destination.toUtf8().constData(),
-                                  path.toUtf8().constData(), interface.toUtf8().constData(),
-                                  member.toUtf8().constData(), arguments, nullptr);
+    emitSignalOver(m_connection.get(), path, interface, member, arguments, destination);
 }
 
 } // namespace Simulator

@@ -76,6 +76,38 @@ using MethodHandlers = std::map<QString, MethodHandler>;
 /** Gives the present value of each property. */
 using PropertyReaders = std::map<QString, std::function<GVariant *()>>;
 
+/** The objects that are offered over one connection, as long as this lives. */
+class ExportedObjects
+{
+public:
+    explicit ExportedObjects(GDBusConnection *connection);
+    ~ExportedObjects();
+    ExportedObjects(const ExportedObjects &) = delete;
+    ExportedObjects &operator=(const ExportedObjects &) = delete;
+
+    /** Offers @p interface at @p path; each method of its contract has a handler, each property a reader. */
+    void add(const QString &path, const QString &interface, MethodHandlers handlers,
+             PropertyReaders properties = {});
+    void remove(const QString &path, const QString &interface);
+
+private:
+    struct Object {
+        QString path;
+        QString interface;
+        MethodHandlers handlers;
+        PropertyReaders properties;
+        guint registration = 0;
+    };
+
+    GDBusConnection *const m_connection;
+    std::vector<std::unique_ptr<Object>> m_objects;
+};
+
+/** Emits a signal over @p connection; @p arguments is a tuple, or null for none. Without a destination it is
+ * for everybody. */
+void emitSignalOver(GDBusConnection *connection, const QString &path, const QString &interface,
+                    const QString &member, GVariant *arguments, const QString &destination = QString());
+
 /** A private connection to the phone's bus with the objects that are offered over it. */
 class BusConnection
 {
@@ -123,18 +155,10 @@ public:
                     const QString &destination = QString()) const;
 
 private:
-    struct Object {
-        QString path;
-        QString interface;
-        MethodHandlers handlers;
-        PropertyReaders properties;
-        guint registration = 0;
-    };
-
     Variant callBus(const char *method, GVariant *arguments) const;
 
     GObjectPointer<GDBusConnection> m_connection;
-    std::vector<std::unique_ptr<Object>> m_objects;
+    std::unique_ptr<ExportedObjects> m_objects;
     std::function<void(const QString &, const QString &)> m_nameHandler;
     guint m_nameSubscription = 0;
     std::function<void(const QString &)> m_signalHandler;

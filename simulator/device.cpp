@@ -4,7 +4,9 @@
 #include "component.h"
 #include "control.h"
 #include "realservice.h"
+#include "refusal.h"
 #include "service.h"
+#include "timer.h"
 
 #include <glib-unix.h>
 
@@ -56,7 +58,12 @@ private:
             m_done(QString());
             return;
         }
-        m_services[m_next++]->start([this](const QString &problem) {
+        PhoneService &service = *m_services[m_next++];
+        if (service.isRunning()) {
+            startNext();
+            return;
+        }
+        service.start([this](const QString &problem) {
             if (problem.isEmpty())
                 startNext();
             else
@@ -67,6 +74,63 @@ private:
     const Services &m_services;
     const PhoneService::Done m_done;
     std::size_t m_next = 0;
+};
+
+/** Takes the phone down and brings it up again. */
+class PowerSwitch
+{
+public:
+    PowerSwitch(Phone &phone, const Services &services)
+        : m_phone(phone)
+        , m_services(services)
+    {
+        phone.goDown = [this](bool restart) {
+            // Not from within a call: its service would go away under it.
+            m_timer.start(0, [this, restart] {
+                m_phone.isOn = false;
+                stop(0, restart);
+            });
+        };
+        phone.comeUp = [this] {
+            start();
+        };
+    }
+
+private:
+    void stop(std::size_t next, bool restart)
+    {
+        if (next == m_services.size()) {
+            if (restart) {
+                ++m_phone.restarts;
+                start();
+            }
+            return;
+        }
+        try {
+            m_services[next]->stop([this, next, restart](const QString &) { stop(next + 1, restart); });
+        } catch (const Refusal &) {
+            // A daemon that is on its way already.
+            stop(next + 1, restart);
+        }
+    }
+
+    void start()
+    {
+        m_phone.isOn = true;
+        try {
+            m_startUp = std::make_unique<StartUp>(m_services, [](const QString &problem) {
+                if (!problem.isEmpty())
+                    std::fprintf(stderr, "corvane-simulator: %s\n", qUtf8Printable(problem));
+            });
+        } catch (const std::runtime_error &error) {
+            std::fprintf(stderr, "corvane-simulator: the phone cannot start: %s\n", error.what());
+        }
+    }
+
+    Phone &m_phone;
+    const Services &m_services;
+    Timer m_timer;
+    std::unique_ptr<StartUp> m_startUp;
 };
 
 } // namespace
@@ -93,6 +157,7 @@ int runDevice(const QJsonObject &profile, const std::vector<RealDaemon> &daemons
         Services services = createServices(profile, replacedNames, phone, journal, faults);
         for (const RealDaemon &daemon : daemons)
             services.push_back(std::make_unique<RealService>(daemon, phone, [&status] { status = 1; }));
+        const PowerSwitch powerSwitch(phone, services);
         const Control control(services, journal, faults,
                               {{QStringLiteral("name"), profile.value(QLatin1String("name"))}});
         const StartUp startUp(services, [&](const QString &problem) {

@@ -9,6 +9,7 @@
 #include <QtCore/QString>
 #include <QtCore/QStringList>
 
+#include <functional>
 #include <map>
 #include <optional>
 #include <vector>
@@ -56,6 +57,14 @@ public:
     QJsonArray installedPackages; ///< when the phone was new, in the profile's words
     Battery battery;
     CellularLinks cellularLinks;
+
+    /** Stops every service as soon as what is under way has been answered, and starts them again to restart.
+     */
+    std::function<void(bool restart)> goDown;
+    /** Starts every service of a phone that is off. */
+    std::function<void()> comeUp;
+    bool isOn = true;
+    int restarts = 0; ///< since the simulator started
 
 private:
     std::map<QString, Sim> m_cards; ///< of the profile, by IMSI

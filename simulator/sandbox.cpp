@@ -96,6 +96,14 @@ void mapUser(uid_t uid, gid_t gid)
     writeFile("/proc/self/gid_map", "0 " + std::to_string(gid) + " 1");
 }
 
+const std::string deviceFolder = "/dev/";
+const std::string deviceClasses = "/sys/class";
+
+bool isBelow(const std::string &path, const std::string &folder)
+{
+    return path.compare(0, folder.size(), folder) == 0;
+}
+
 /** Writes the phone's files to a layer that goes over the machine's folder. */
 void writeLayer(const PhoneFiles &files)
 {
@@ -107,6 +115,8 @@ void writeLayer(const PhoneFiles &files)
     for (const std::string &folder : files.ownFolders)
         makeFolders(layer + folder);
     for (const auto &[path, content] : files.files) {
+        if (isBelow(path, deviceFolder))
+            continue;
         makeFolders(fs::path(layer + path).parent_path());
         writeFile(layer + path, content);
     }
@@ -117,10 +127,15 @@ void writeLayer(const PhoneFiles &files)
     }
 }
 
+/** Inside a user namespace an overlay may only keep its notes in user attributes. */
+std::string overlayOptions()
+{
+    return inUserNamespace() ? ",userxattr" : "";
+}
+
 void mountOverlays()
 {
-    // Inside a user namespace an overlay may only keep its notes in user attributes.
-    const std::string options = inUserNamespace() ? ",userxattr" : "";
+    const std::string options = overlayOptions();
     for (const char *folder : {"/etc", "/usr", "/var"}) {
         const std::string upper = storage + "/upper" + folder;
         const std::string work = storage + "/work" + folder;
@@ -140,7 +155,7 @@ void mountOwnFolders(const std::vector<std::string> &folders)
 }
 
 /** A /dev without the machine's disks, clock and kernel log. */
-void mountDevices()
+void mountDevices(const PhoneFiles &files)
 {
     const std::string dev = storage + "/dev";
     makeFolders(dev);
@@ -164,6 +179,12 @@ void mountDevices()
         if (symlink(target, (dev + link).c_str()) < 0)
             throw SetUpError::fromErrno("cannot create " + dev + link);
     }
+    for (const auto &[path, content] : files.files) {
+        if (!isBelow(path, deviceFolder))
+            continue;
+        makeFolders(fs::path(storage + path).parent_path());
+        writeFile(storage + path, content);
+    }
     mountOn("/dev", nullptr, dev, MS_MOVE);
 }
 
@@ -184,6 +205,11 @@ void mountKernelFileSystems()
         makeReadOnly("/proc/sysrq-trigger");
     // Shows the phone's network interfaces in place of the machine's.
     mountOn("/sys", "sysfs", "sysfs", MS_RDONLY | MS_NOSUID | MS_NODEV | MS_NOEXEC);
+    const std::string layer = storage + "/layer" + deviceClasses;
+    if (fs::exists(layer)) {
+        mountOn(deviceClasses, "overlay", "phone", MS_RDONLY | MS_NOSUID | MS_NODEV | MS_NOEXEC,
+                "lowerdir=" + layer + ":" + deviceClasses + overlayOptions());
+    }
 }
 
 void mountRun()
@@ -255,7 +281,7 @@ void buildPhone(const std::string &hostName, const PhoneFiles &files)
     writeLayer(files);
     mountOverlays();
     mountOwnFolders(files.ownFolders);
-    mountDevices();
+    mountDevices(files);
     mountKernelFileSystems();
     mountRun();
     bringLoopbackUp();

@@ -25,11 +25,12 @@ public:
 
 /** What the phone has at fixed paths, beside or in place of what the machine has there. */
 struct PhoneFiles {
-    /** Contents by absolute path, below /etc, /usr or /var. */
+    /** Contents by absolute path, below /etc, /usr, /var, /dev or /sys/class. */
     std::map<std::string, std::string> files;
     /** Where symbolic links lead to, by absolute path below /etc, /usr or /var. They hide what is there. */
     std::map<std::string, std::string> links;
-    /** Folders below /etc, /usr or /var that everything in the phone may write to. */
+    /** Folders below /etc, /usr or /var that everything in the phone may write to; those below /sys/class are
+     * only there. */
     std::vector<std::string> writableFolders;
     /** Folders below /etc, /usr or /var in which the phone has its own files and none of the machine's. */
     std::vector<std::string> ownFolders;

@@ -53,18 +53,32 @@ void Service::disconnect()
     for (const std::unique_ptr<Component> &component : components())
         component->detach();
     m_clientHandlers.clear();
+    m_socket.reset();
     m_connection.reset();
+}
+
+void Service::listenAt(const QString &path)
+{
+    m_socket = std::make_unique<PeerSocket>(path, [this](GDBusConnection *connection) {
+        Traffic::watch(connection, name(), m_journal, m_faults);
+    });
 }
 
 void Service::addObject(const QString &path, const QString &interface, MethodHandlers handlers,
                         PropertyReaders properties)
 {
-    m_connection->addObject(path, interface, std::move(handlers), std::move(properties));
+    if (m_socket)
+        m_socket->addObject(path, interface, handlers, properties);
+    else
+        m_connection->addObject(path, interface, std::move(handlers), std::move(properties));
 }
 
 void Service::removeObject(const QString &path, const QString &interface)
 {
-    m_connection->removeObject(path, interface);
+    if (m_socket)
+        m_socket->removeObject(path, interface);
+    else
+        m_connection->removeObject(path, interface);
 }
 
 void Service::watchClients(std::function<void(const QString &)> handler)
@@ -77,7 +91,9 @@ void Service::emitSignal(const QString &path, const QString &interface, const QS
 {
     // Owned here: a service that is stopped would leave a floating value behind.
     const Variant values(arguments);
-    if (isRunning())
+    if (m_socket)
+        m_socket->emitSignal(path, interface, member, values);
+    else if (isRunning())
         m_connection->emitSignal(path, interface, member, values.get(), destination);
 }
 

@@ -5,6 +5,7 @@
 #include "busconnection.h"
 #include "faults.h"
 #include "journal.h"
+#include "peersocket.h"
 #include "phoneservice.h"
 
 #include <QtCore/QString>
@@ -31,6 +32,12 @@ public:
     void start(const Done &done) override;
     void stop(const Done &done) override;
 
+    /**
+     * Offers the objects to clients at the socket @p path, and not on the bus, which only has the name. For a
+     * component in attach(), before its first object. Throws BusError.
+     */
+    void listenAt(const QString &path);
+
     /** For components while they are attached. */
     void addObject(const QString &path, const QString &interface, MethodHandlers handlers,
                    PropertyReaders properties = {});
@@ -52,6 +59,7 @@ private:
     FaultTable &m_faults;
     std::vector<std::function<void(const QString &)>> m_clientHandlers;
     std::unique_ptr<BusConnection> m_connection;
+    std::unique_ptr<PeerSocket> m_socket; ///< null: the objects are on the bus
 };
 
 } // namespace Simulator

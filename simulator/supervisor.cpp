@@ -4,6 +4,7 @@
 #include "busconnection.h"
 #include "component.h"
 #include "device.h"
+#include "hardware.h"
 #include "logtail.h"
 #include "sandbox.h"
 
@@ -214,6 +215,7 @@ PhoneFiles Supervisor::phoneFiles() const
               .toHex()
               .toStdString()
         + "\n";
+    addHardware(m_settings.profile.object, phone);
     for (const ComponentType &type : ComponentRegistration::all()) {
         if (type.addFiles)
             type.addFiles(m_settings.profile.object, phone);

@@ -34,6 +34,9 @@ Command countersCommand();
 Command cellularCommand();
 Command apnCommand();
 Command notifyCommand();
+Command lockCommand();
+Command securityCommand();
+Command infoCommand();
 Command policyCommand();
 
 // Options that commands share.

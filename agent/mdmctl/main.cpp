@@ -34,13 +34,30 @@ Command program()
                                         "  1  refused or failed\n"
                                         "  2  wrong usage: nothing was sent\n"
                                         "  3  the service that it takes is not available");
-    mdmctl.commands = {updateCommand(),    callsCommand(),        smsCommand(),
-                       dataCommand(),      simCommand(),          callStatisticsCommand(),
-                       wifiCommand(),      flightModeCommand(),   cellularCommand(),
-                       apnCommand(),       proxyCommand(),        countersCommand(),
-                       packagesCommand(),  applicationsCommand(), installCommand(),
-                       removeCommand(),    accountCommand(),      certificatesCommand(),
-                       autostartCommand(), notifyCommand(),       policyCommand()};
+    mdmctl.commands = {infoCommand(),
+                       updateCommand(),
+                       callsCommand(),
+                       smsCommand(),
+                       dataCommand(),
+                       simCommand(),
+                       callStatisticsCommand(),
+                       wifiCommand(),
+                       flightModeCommand(),
+                       cellularCommand(),
+                       apnCommand(),
+                       proxyCommand(),
+                       countersCommand(),
+                       packagesCommand(),
+                       applicationsCommand(),
+                       installCommand(),
+                       removeCommand(),
+                       accountCommand(),
+                       certificatesCommand(),
+                       autostartCommand(),
+                       notifyCommand(),
+                       lockCommand(),
+                       securityCommand(),
+                       policyCommand()};
     mdmctl.commands.append(completionCommand(mdmctl));
     return mdmctl;
 }

@@ -5,10 +5,12 @@
 #include "autostartsection.h"
 #include "cellularsection.h"
 #include "certificatesection.h"
+#include "devicelocksection.h"
 #include "packagesection.h"
 #include "proxysection.h"
 #include "radiosection.h"
 #include "rulesection.h"
+#include "securitysection.h"
 #include "softwareupdatesection.h"
 
 namespace Corvane
@@ -29,6 +31,8 @@ PolicySections makePolicySections(const Timeouts &timeouts)
     sections.push_back(std::make_unique<AccountSection>());
     sections.push_back(std::make_unique<CertificateSection>(timeouts.confirmation));
     sections.push_back(std::make_unique<AutostartSection>());
+    sections.push_back(std::make_unique<DeviceLockSection>(timeouts.confirmation));
+    sections.push_back(std::make_unique<SecuritySection>(timeouts.silence));
     sections.push_back(std::make_unique<SoftwareUpdateSection>(timeouts.silence));
     return sections;
 }

@@ -37,6 +37,16 @@ Service Service::certificateHelper()
     return {QString(), QStringLiteral("certificate helper")};
 }
 
+Service Service::deviceLock()
+{
+    return {QStringLiteral("org.veldmobile.devicelock"), QStringLiteral("device-lock daemon")};
+}
+
+Service Service::bus()
+{
+    return {QStringLiteral("org.freedesktop.DBus"), QStringLiteral("system bus")};
+}
+
 QString Service::toString() const
 {
     if (name.isEmpty())

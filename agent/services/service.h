@@ -17,6 +17,9 @@ struct Service {
     QString description; ///< for people
 
     static Service telephony();
+    static Service deviceLock();
+    /** The bus itself, which answers for services that come and go. */
+    static Service bus();
     static Service connectionManager();
     static Service mdmProxy();
     static Service packageKit();

@@ -1,5 +1,6 @@
 // SPDX-License-Identifier: LGPL-2.1-or-later
 #include "component.h"
+#include "hardware.h"
 #include "mdmproxy.h"
 #include "refusal.h"
 #include "service.h"
@@ -280,6 +281,7 @@ void SoftwareUpdate::finishInstallation()
         return;
     }
     m_installed = m_update.version;
+    setOperatingSystem(m_installed);
     m_downloaded.clear();
     m_found.erase(
         std::remove_if(m_found.begin(), m_found.end(),

@@ -8,6 +8,7 @@
 #include <corvanemdm/connectivitysettings.h>
 #include <corvanemdm/corvanemdm_global.h>
 #include <corvanemdm/datetimesettings.h>
+#include <corvanemdm/devicelock.h>
 #include <corvanemdm/emailaccountprovisioner.h>
 #include <corvanemdm/genericaccountprovisioner.h>
 #include <corvanemdm/locationinfo.h>
@@ -16,12 +17,14 @@
 #include <corvanemdm/networkdatacounter.h>
 #include <corvanemdm/notificationinfo.h>
 #include <corvanemdm/provisioner.h>
+#include <corvanemdm/securitysettings.h>
 #include <corvanemdm/simfilter.h>
 #include <corvanemdm/siminfo.h>
 #include <corvanemdm/simmobiledatafilter.h>
 #include <corvanemdm/simsmsfilter.h>
 #include <corvanemdm/simvoicecallfilter.h>
 #include <corvanemdm/softwareupdate.h>
+#include <corvanemdm/sysinfo.h>
 
 #include <QtCore/QCoreApplication>
 #include <QtCore/QDebug>
@@ -203,6 +206,35 @@ bool batteryInfoWorks()
     return battery.chargePercentage() == -1 && battery.status() == BatteryInfo::BatteryStatusUnknown;
 }
 
+bool deviceLockWorks()
+{
+    DeviceLock lock;
+    QObject::connect(&lock, &DeviceLock::deviceCleared, &lock, [] {});
+    // The state comes with the event loop; a partition of the phone is not asserted.
+    lock.isHomeEncrypted();
+    return lock.state() == DeviceLock::Undefined && !lock.clearingDevice()
+        && (DeviceLock::RebootAfterClear | DeviceLock::WipePartitions) == DeviceLock::ClearOptions(3);
+}
+
+bool sysInfoWorks()
+{
+    // What there is is the machine's matter.
+    const QStringList facts{SysInfo::softwareVersion(), SysInfo::softwareVersionId(),
+                            SysInfo::wlanMacAddress(),  SysInfo::deviceModel(),
+                            SysInfo::deviceUid(),       SysInfo::productName(),
+                            SysInfo::manufacturer(),    SysInfo::bluetoothMacAddress()};
+    return facts.size() == 8;
+}
+
+bool securitySettingsWork()
+{
+    SecuritySettings settings;
+    QObject::connect(&settings, &SecuritySettings::developerModeEnabledChanged, &settings, [] {});
+    // As it is already: nothing happens.
+    settings.setDeveloperModeEnabled(settings.developerModeEnabled());
+    return !settings.sideloadingAllowed();
+}
+
 QString latestVersion()
 {
     const SoftwareUpdate update;
@@ -217,11 +249,26 @@ int main(int argc, char **argv)
 {
     QCoreApplication application(argc, argv);
     bool (*const checks[])() = {
-        simFilterWorks,          simInfoWorks,         connectivitySettingsWork, simVoiceCallFilterWorks,
-        otherFiltersWork,        callStatisticsWork,   applicationsWork,         notificationInfoWorks,
-        locationInfoWorks,       locationSettingsWork, dateTimeSettingsWork,     batteryInfoWorks,
-        provisionersWork,        autostartWorks,       certificatesWork,         netProxyWorks,
+        simFilterWorks,
+        simInfoWorks,
+        connectivitySettingsWork,
+        simVoiceCallFilterWorks,
+        otherFiltersWork,
+        callStatisticsWork,
+        applicationsWork,
+        notificationInfoWorks,
+        locationInfoWorks,
+        locationSettingsWork,
+        dateTimeSettingsWork,
+        batteryInfoWorks,
+        provisionersWork,
+        autostartWorks,
+        certificatesWork,
+        netProxyWorks,
         networkDataCounterWorks,
+        deviceLockWorks,
+        sysInfoWorks,
+        securitySettingsWork,
     };
     const bool works
         = std::all_of(std::begin(checks), std::end(checks), [](bool (*check)()) { return check(); });
