@@ -19,7 +19,7 @@ function(corvanemdm_platform_library name)
     set(target corvanemdm-platform-${name})
     add_library(${target} INTERFACE)
     if(${choice} STREQUAL "system")
-        pkg_check_modules(CORVANE_SYSTEM_${upper} QUIET IMPORTED_TARGET ${${choice}_MODULE})
+        pkg_check_modules(CORVANE_SYSTEM_${upper} QUIET IMPORTED_TARGET GLOBAL ${${choice}_MODULE})
         if(NOT CORVANE_SYSTEM_${upper}_FOUND)
             message(FATAL_ERROR "${choice}=system, but pkg-config knows no module '${${choice}_MODULE}'. "
                                 "Install it, name another in ${choice}_MODULE, or set ${choice}=bundled.")

@@ -81,12 +81,13 @@ public:
         SbasData = 0x40000000, ///< satellites that correct others
         LastDataSource = 0x80000000 ///< the highest flag
     };
+    /** Several of them. */
     Q_DECLARE_FLAGS(DataSources, DataSource)
     Q_FLAG(DataSources)
 
     /** As with SynchronousMode. */
     explicit LocationSettings(QObject *parent = nullptr);
-    explicit LocationSettings(Mode mode, QObject *parent = nullptr);
+    explicit LocationSettings(Mode mode, QObject *parent = nullptr); ///< any other mode is AsynchronousMode
     ~LocationSettings() override;
 
     /** Whether the phone has a receiver for satellite navigation. */

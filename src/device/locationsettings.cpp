@@ -18,8 +18,8 @@ const QLatin1String mls("mls");
 
 /** The platform's states of a provider, under the names that this class has for them. */
 constexpr auto agreementNotAccepted = ::LocationSettings::OnlineAGpsAgreementNotAccepted;
-constexpr auto disabled = ::LocationSettings::OnlineAGpsDisabled;
-constexpr auto enabled = ::LocationSettings::OnlineAGpsEnabled;
+constexpr auto providerDisabled = ::LocationSettings::OnlineAGpsDisabled;
+constexpr auto providerEnabled = ::LocationSettings::OnlineAGpsEnabled;
 
 /** Which providers the phone has, as the first object that was asked has found it. */
 struct Availability {
@@ -165,7 +165,7 @@ bool LocationSettings::agpsEnabled(const QString &agpsProvider) const
 {
     if (!agpsAvailable(agpsProvider))
         return false;
-    return (agpsProvider != mls || d->mlsEnabled()) && stateOf(d, agpsProvider) == enabled;
+    return (agpsProvider != mls || d->mlsEnabled()) && stateOf(d, agpsProvider) == providerEnabled;
 }
 
 bool LocationSettings::agpsAgreementAccepted(const QString &agpsProvider) const
@@ -187,10 +187,10 @@ void LocationSettings::setAgpsEnabled(const QString &agpsProvider, bool value)
             qWarning() << "Unable to enable HERE aGPS - usage agreement has not been accepted!";
         return;
     }
-    if (value && state == disabled)
-        setState(d, agpsProvider, enabled);
-    else if (!value && state == enabled)
-        setState(d, agpsProvider, disabled);
+    if (value && state == providerDisabled)
+        setState(d, agpsProvider, providerEnabled);
+    else if (!value && state == providerEnabled)
+        setState(d, agpsProvider, providerDisabled);
 }
 
 void LocationSettings::setAgpsAgreementAccepted(const QString &agpsProvider, bool value)
@@ -200,7 +200,7 @@ void LocationSettings::setAgpsAgreementAccepted(const QString &agpsProvider, boo
     if (!value)
         setState(d, agpsProvider, agreementNotAccepted);
     else if (stateOf(d, agpsProvider) == agreementNotAccepted)
-        setState(d, agpsProvider, disabled);
+        setState(d, agpsProvider, providerDisabled);
 }
 
 void LocationSettings::allowDataSource(DataSource dataSource)
