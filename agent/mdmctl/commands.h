@@ -37,6 +37,8 @@ Command notifyCommand();
 Command lockCommand();
 Command securityCommand();
 Command infoCommand();
+Command locationCommand();
+Command timeCommand();
 Command policyCommand();
 
 // Options that commands share.

@@ -55,6 +55,8 @@ Command program()
                        certificatesCommand(),
                        autostartCommand(),
                        notifyCommand(),
+                       locationCommand(),
+                       timeCommand(),
                        lockCommand(),
                        securityCommand(),
                        policyCommand()};

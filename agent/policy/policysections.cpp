@@ -6,6 +6,7 @@
 #include "cellularsection.h"
 #include "certificatesection.h"
 #include "devicelocksection.h"
+#include "devicesettingssection.h"
 #include "packagesection.h"
 #include "proxysection.h"
 #include "radiosection.h"
@@ -31,6 +32,10 @@ PolicySections makePolicySections(const Timeouts &timeouts)
     sections.push_back(std::make_unique<AccountSection>());
     sections.push_back(std::make_unique<CertificateSection>(timeouts.confirmation));
     sections.push_back(std::make_unique<AutostartSection>());
+    sections.push_back(
+        std::make_unique<DeviceSettingsSection>(QStringLiteral("location"), makeLocationSettings, timeouts));
+    sections.push_back(
+        std::make_unique<DeviceSettingsSection>(QStringLiteral("time"), makeClockSettings, timeouts));
     sections.push_back(std::make_unique<DeviceLockSection>(timeouts.confirmation));
     sections.push_back(std::make_unique<SecuritySection>(timeouts.silence));
     sections.push_back(std::make_unique<SoftwareUpdateSection>(timeouts.silence));

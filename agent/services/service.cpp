@@ -47,6 +47,11 @@ Service Service::bus()
     return {QStringLiteral("org.freedesktop.DBus"), QStringLiteral("system bus")};
 }
 
+Service Service::clock()
+{
+    return {QStringLiteral("org.freedesktop.timedate1"), QStringLiteral("time service")};
+}
+
 QString Service::toString() const
 {
     if (name.isEmpty())

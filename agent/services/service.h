@@ -25,6 +25,7 @@ struct Service {
     static Service packageKit();
     /** A program rather than a service of the bus: it has no name there, and is always at hand. */
     static Service certificateHelper();
+    static Service clock();
 
     /** "the telephony service (org.ofono)" */
     QString toString() const;
