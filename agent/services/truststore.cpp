@@ -53,7 +53,7 @@ QString nameOf(const std::function<QStringList(QSslCertificate::SubjectInfo)> &i
 TrustStore::TrustStore(std::chrono::milliseconds timeout, QObject *parent)
     : QObject(parent)
     , m_timeout(timeout)
-    , m_warnings(QStringLiteral("^(Installing certificate failed:|Unable to execute mdm-certificate)"),
+    , m_warnings(QStringLiteral("^(?:Installing certificate failed:|Unable to execute mdm-certificate)"),
                  [this](const QString &warning) { m_refusal = refusalIn(warning); })
 {
     connect(&m_certificates, &Certificates::installedFilesChanged, this, &TrustStore::changed);
@@ -86,7 +86,7 @@ Reply TrustStore::perform(Finished finished, const std::function<void()> &reques
     connect(&m_certificates, finished, &wait,
             [this, &wait, &helper](const CertificateFile &, Certificates::Result result) {
                 wait.end(result == Certificates::Success ? Reply::Done : Reply::Refused,
-                         QStringLiteral("%1 refused: %2").arg(helper.toString(), m_refusal));
+                         helper.refusal(m_refusal));
             });
     request();
     return wait.run();
