@@ -94,7 +94,8 @@ public:
     /**
      * Keeps everybody out of the phone, or lets them in again.
      * @param mode what to do
-     * @param feedback what the phone tells who finds it locked; the daemon defines the keys
+     * @param feedback what the phone tells who finds it locked; the daemon defines the keys. With a value
+     * that D-Bus has no type for, an invalid QVariant included, the command fails without being sent.
      */
     Q_INVOKABLE void setLockoutMode(Corvane::Mdm::DeviceLock::ManagerLockoutMode mode,
                                     const QVariantMap &feedback = QVariantMap());

@@ -3,6 +3,7 @@
 
 #include "deviceencryption_p.h"
 #include "devicelock_p.h"
+#include "frame/marshalling_p.h"
 
 namespace Corvane
 {
@@ -69,7 +70,11 @@ bool DeviceLock::isHomeEncrypted() const
 
 void DeviceLock::setLockoutMode(ManagerLockoutMode mode, const QVariantMap &feedback)
 {
-    d->lockoutMode.follow(d->connection.interface()->call(SetLockoutMode, {uint(mode), feedback}));
+    // QtDBus would end the program over it.
+    if (isMarshallable(feedback))
+        d->lockoutMode.follow(d->connection.interface()->call(SetLockoutMode, {uint(mode), feedback}));
+    else
+        d->lockoutMode.refuse();
 }
 
 void DeviceLock::clearDevice(ClearOptions options)

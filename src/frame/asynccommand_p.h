@@ -5,6 +5,8 @@
 #include <QtCore/QPointer>
 #include <QtDBus/QDBusPendingCall>
 
+#include <utility>
+
 namespace Corvane
 {
 namespace Mdm
@@ -54,26 +56,44 @@ public:
     {
     }
 
-    ~AsyncCommand() { delete m_pending; }
+    ~AsyncCommand() { drop(); }
 
-    bool isBusy() const { return m_pending != nullptr; }
+    bool isBusy() const { return m_pending || m_refusal; }
 
     /** Takes over @p pending, the answer to a command that has just been sent. */
     void follow(Pending *pending)
     {
-        delete m_pending;
+        drop();
         m_pending = pending;
         connectOutcome(
             pending, m_feature, [this] { finish(m_succeeded); }, [this] { finish(m_failed); });
         Q_EMIT(m_feature->*m_busyChanged)();
     }
 
+    /** Stands in for follow() when the command cannot be sent: it fails from the event loop, as any other. */
+    void refuse()
+    {
+        drop();
+        m_refusal = new QObject;
+        QMetaObject::invokeMethod(
+            m_refusal, [this] { finish(m_failed); }, Qt::QueuedConnection);
+        Q_EMIT(m_feature->*m_busyChanged)();
+    }
+
 private:
     Q_DISABLE_COPY(AsyncCommand)
+
+    void drop()
+    {
+        delete std::exchange(m_pending, nullptr);
+        delete std::exchange(m_refusal, nullptr);
+    }
 
     void finish(Signal outcome)
     {
         m_pending = nullptr;
+        if (m_refusal)
+            std::exchange(m_refusal, nullptr)->deleteLater(); // it is calling
         // A receiver of the first signal may delete the feature, and this command with it.
         const QPointer<Feature> feature(m_feature);
         Q_EMIT(m_feature->*m_busyChanged)();
@@ -86,6 +106,7 @@ private:
     const Signal m_succeeded;
     const Signal m_failed;
     Pending *m_pending = nullptr;
+    QObject *m_refusal = nullptr;
 };
 
 } // namespace Mdm

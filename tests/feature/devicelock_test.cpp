@@ -114,6 +114,7 @@ private Q_SLOTS:
     void clearOptionsOnTheWire_data();
     void clearOptionsOnTheWire();
     void lockoutFeedbackOnTheWire();
+    void feedbackThatCannotBeSentFails();
     void securityCodesOnTheWire();
 
     void clearingErasesAndShutsDown();
@@ -569,6 +570,42 @@ void DeviceLockTest::lockoutFeedbackOnTheWire()
     // A mode that there is not is the daemon's matter.
     lock.setLockoutMode(DeviceLock::ManagerLockoutMode(7));
     QVERIFY(waitUntil([&] { return seen.signalsSeen().contains(lockoutCommand.failed); }));
+}
+
+void DeviceLockTest::feedbackThatCannotBeSentFails()
+{
+    const QVariantMap feedback{
+        {QStringLiteral("more"), QVariantList{QVariantMap{{QStringLiteral("nothing"), QVariant()}}}}};
+    DeviceLock lock;
+    QVERIFY(waitUntil([&] { return lock.state() != DeviceLock::Undefined; }));
+    SignalSequence seen(&lock);
+    lock.setLockoutMode(DeviceLock::ManagerLockoutOn, feedback);
+    QVERIFY(lock.settingLockoutMode());
+    QVERIFY(seen.waitFor(3));
+    QVERIFY(!lock.settingLockoutMode());
+    QCOMPARE(seen.take(),
+             QStringList({lockoutCommand.busyChanged, lockoutCommand.busyChanged, lockoutCommand.failed}));
+    QCOMPARE(m_phone->takeJournal(Service).filter(SetLockoutMode), QStringList());
+
+    // A newer command supersedes it, and it a newer one.
+    lock.setLockoutMode(DeviceLock::ManagerLockoutOn, feedback);
+    lock.setLockoutMode(DeviceLock::ManagerLockoutOff);
+    QVERIFY(seen.waitFor(4));
+    QCOMPARE(seen.take(),
+             QStringList({lockoutCommand.busyChanged, lockoutCommand.busyChanged, lockoutCommand.busyChanged,
+                          lockoutCommand.succeeded}));
+    lock.setLockoutMode(DeviceLock::ManagerLockoutOff);
+    lock.setLockoutMode(DeviceLock::ManagerLockoutOn, feedback);
+    QVERIFY(seen.waitFor(4));
+    QCOMPARE(seen.take(),
+             QStringList({lockoutCommand.busyChanged, lockoutCommand.busyChanged, lockoutCommand.busyChanged,
+                          lockoutCommand.failed}));
+
+    // Its object may go before it has failed.
+    auto *brief = new DeviceLock;
+    brief->setLockoutMode(DeviceLock::ManagerLockoutOn, feedback);
+    delete brief;
+    QCoreApplication::processEvents();
 }
 
 void DeviceLockTest::securityCodesOnTheWire()
