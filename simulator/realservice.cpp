@@ -187,6 +187,9 @@ void RealService::timedOut()
 
 void RealService::finish(const QString &problem)
 {
+    // Hardware may be up only after its daemon has ended, or been given up.
+    if (m_phase == Idle)
+        return;
     if (m_timer)
         g_source_remove(std::exchange(m_timer, 0));
     m_phase = Idle;

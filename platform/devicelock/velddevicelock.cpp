@@ -3,6 +3,8 @@
 
 #include <devicelock/velddbusconnection.h>
 
+#include "frame/signalconnection_p.h"
+
 #include <QtCore/QPointer>
 #include <QtDBus/QDBusMessage>
 #include <QtDBus/QDBusPendingCallWatcher>
@@ -85,7 +87,8 @@ private:
         if (!connection.isConnected())
             return;
         QDBusConnection peer = connection.connection();
-        peer.connect(QString(), statePath, stateInterface, changedMember, this, SLOT(setState(uint)));
+        connectDBusSignal(peer, {QString(), statePath, stateInterface, changedMember}, this,
+                          SLOT(setState(uint)));
         answer = std::make_unique<QDBusPendingCallWatcher>(
             peer.asyncCall(QDBusMessage::createMethodCall(QString(), statePath, stateInterface, getMethod)));
         connect(answer.get(), &QDBusPendingCallWatcher::finished, this, [this] {

@@ -9,6 +9,8 @@
 #include <QtDBus/QDBusConnection>
 #include <QtDBus/QDBusReply>
 
+#include <glib.h>
+
 #include <algorithm>
 #include <iterator>
 
@@ -551,7 +553,7 @@ QString ConnectivitySettings::modemSimImsi(const QString &modemPath) const
 {
     QVariantMap properties;
     // A text that is no path ends the program in the D-Bus library.
-    if (!QDBusObjectPath(modemPath).path().isEmpty()) {
+    if (g_variant_is_object_path(modemPath.toUtf8().constData())) {
         QDBusInterface sim(OfonoService, modemPath, SimManagerInterface, QDBusConnection::systemBus());
         properties = readProperties(&sim);
     }
