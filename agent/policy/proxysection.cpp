@@ -112,10 +112,7 @@ Reply ProxySection::open(const QJsonObject &)
 {
     m_proxies = std::make_unique<Proxies>(m_timeout);
     const Reply opened = m_proxies->open();
-    if (opened.isDone()) {
-        follow(Proxies::global());
-    }
-    return opened;
+    return opened.isDone() ? follow(Proxies::global()).reply : opened;
 }
 
 void ProxySection::close()
@@ -124,18 +121,25 @@ void ProxySection::close()
     m_proxies.reset();
 }
 
-/** A selection hears of its own proxy alone, so that each that is to be followed has one. */
-void ProxySection::follow(const QString &identifier)
+/**
+ * A selection hears of its own proxy alone, so that each that is followed has one. What it has heard of is
+ * looked at and changed through itself: another selection may hear of the same later.
+ */
+ProxySection::Followed ProxySection::follow(const QString &identifier)
 {
-    const bool isFollowed = std::any_of(m_followed.begin(), m_followed.end(),
-                                        [&](const auto &each) { return each->identifier() == identifier; });
-    if (isFollowed)
-        return;
+    const auto known = std::find_if(m_followed.begin(), m_followed.end(),
+                                    [&](const auto &each) { return each->identifier() == identifier; });
+    if (known != m_followed.end())
+        return {known->get(), {}};
     auto followed = std::make_unique<Proxies>(m_timeout);
-    if (!followed->open().isDone() || !followed->select(identifier).isDone())
-        return;
+    Reply reply = followed->open();
+    if (reply.isDone())
+        reply = followed->select(identifier);
+    if (!reply.isDone())
+        return {nullptr, reply};
     connect(followed.get(), &Proxies::changed, this, &ProxySection::drifted);
     m_followed.push_back(std::move(followed));
+    return {m_followed.back().get(), {}};
 }
 
 QVector<Setting> ProxySection::compare(const QJsonObject &wanted)
@@ -156,9 +160,12 @@ QVector<Setting> ProxySection::compare(const QJsonObject &wanted)
     return compared;
 }
 
-Setting ProxySection::compareUse(Setting setting) const
+Setting ProxySection::compareUse(Setting setting)
 {
-    const QString use = m_proxies->usesGlobal() ? globalMember : networksMember;
+    const Followed global = follow(Proxies::global());
+    if (!global.proxies)
+        return setting.with(Setting::Failed, global.reply.text);
+    const QString use = global.proxies->usesGlobal() ? globalMember : networksMember;
     setting.present = {use, use};
     setting.status = setting.wanted.text == use ? Setting::Compliant : Setting::Different;
     return setting;
@@ -166,10 +173,10 @@ Setting ProxySection::compareUse(Setting setting) const
 
 Setting ProxySection::compareGlobal(Setting setting)
 {
-    const Reply selected = m_proxies->select(Proxies::global());
-    if (!selected.isDone())
-        return setting.with(Setting::Failed, selected.text);
-    const ProxyConfiguration present = m_proxies->configuration();
+    const Followed global = follow(Proxies::global());
+    if (!global.proxies)
+        return setting.with(Setting::Failed, global.reply.text);
+    const ProxyConfiguration present = global.proxies->configuration();
     setting.present = valueOf(present);
     setting.status = present == wantedBy(setting) ? Setting::Compliant : Setting::Different;
     return setting;
@@ -182,10 +189,10 @@ Setting ProxySection::compareNetworks(Setting setting, const QString &name)
         return setting.with(Setting::Unsupported, QStringLiteral("the phone has no such network saved now"));
     setting.status = Setting::Compliant;
     for (const QString &network : networks) {
-        follow(network);
-        if (!m_proxies->select(network).isDone())
+        const Followed followed = follow(network);
+        if (!followed.proxies)
             continue; // it has just gone
-        const ProxyConfiguration present = m_proxies->configuration();
+        const ProxyConfiguration present = followed.proxies->configuration();
         const bool isAsWanted = present == wantedBy(setting);
         // Of several networks with that name, the first that differs is shown.
         if (setting.status == Setting::Compliant)
@@ -198,15 +205,17 @@ Setting ProxySection::compareNetworks(Setting setting, const QString &name)
 
 Reply ProxySection::change(const Setting &setting)
 {
-    if (setting.path == usePath)
-        return m_proxies->useGlobal(setting.wanted.text == globalMember);
-    const QStringList targets = setting.path == globalPath
+    const bool concernsUse = setting.path == usePath;
+    const QStringList targets = concernsUse || setting.path == globalPath
         ? QStringList(Proxies::global())
         : m_proxies->networksNamed(setting.path.mid(networksPath.size()));
     for (const QString &target : targets) {
-        Reply reply = m_proxies->select(target);
-        if (reply.isDone())
-            reply = m_proxies->configure(wantedBy(setting));
+        const Followed followed = follow(target);
+        Reply reply = followed.reply;
+        if (followed.proxies) {
+            reply = concernsUse ? followed.proxies->useGlobal(setting.wanted.text == globalMember)
+                                : followed.proxies->configure(wantedBy(setting));
+        }
         if (!reply.isDone())
             return reply;
     }

@@ -33,14 +33,21 @@ public:
     QJsonObject exported() override;
 
 private:
-    Setting compareUse(Setting setting) const;
+    /** A proxy that is followed, or why it is not. */
+    struct Followed {
+        Proxies *proxies = nullptr;
+        Reply reply;
+    };
+
+    Setting compareUse(Setting setting);
     Setting compareGlobal(Setting setting);
     Setting compareNetworks(Setting setting, const QString &name);
-    void follow(const QString &identifier);
+    Followed follow(const QString &identifier);
 
     const std::chrono::milliseconds m_timeout;
-    std::unique_ptr<Proxies> m_proxies;
-    std::vector<std::unique_ptr<Proxies>> m_followed; ///< one for each network of the policy that is there
+    std::unique_ptr<Proxies> m_proxies; ///< tells which networks there are
+    std::vector<std::unique_ptr<Proxies>>
+        m_followed; ///< the global one, and each network of the policy that is there
 };
 
 } // namespace Agent
