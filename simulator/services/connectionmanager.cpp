@@ -117,6 +117,7 @@ private:
     QString addNetwork(const QStringList &arguments);
     QString setTechnologyThere(const QString &type, bool isThere);
     std::vector<Action> networkActions();
+    std::vector<Action> counterActions();
     std::vector<Action> phoneActions();
 
     CellularLinks &m_links;
@@ -589,8 +590,8 @@ QString ConnectionManager::setTechnologyThere(const QString &type, bool isThere)
 std::vector<Action> ConnectionManager::actions()
 {
     std::vector<Action> actions = networkActions();
-    const std::vector<Action> others = phoneActions();
-    actions.insert(actions.end(), others.begin(), others.end());
+    for (const std::vector<Action> &others : {counterActions(), phoneActions()})
+        actions.insert(actions.end(), others.begin(), others.end());
     return actions;
 }
 
@@ -641,6 +642,13 @@ std::vector<Action> ConnectionManager::networkActions()
              network(arguments.first()).setProxy(ProxyConfiguration(arguments.mid(1)));
              return QString();
          }},
+    };
+}
+
+/** What happens to the counters of clients. */
+std::vector<Action> ConnectionManager::counterActions()
+{
+    return {
         {QStringLiteral("counter usage"), QStringLiteral("PATH HOME ROAMING"),
          QStringLiteral("sends all counters a report as it is given, with dictionaries such as "
                         "{'RX.Bytes': <uint64 100>}"),
