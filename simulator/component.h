@@ -18,6 +18,7 @@ namespace Simulator
 {
 
 class Service;
+struct PhoneFiles;
 
 /** Something that can be done to the phone from outside, as a person or the world would. */
 struct Action {
@@ -60,6 +61,8 @@ struct ComponentType {
      * right; empty when all is well.
      */
     std::function<QString(const QJsonObject &profile)> problemOf;
+    /** Adds what the phone has at fixed paths for it; empty when that is nothing. */
+    std::function<void(const QJsonObject &profile, PhoneFiles &files)> addFiles = {};
 };
 
 class ComponentRegistration

@@ -2,6 +2,7 @@
 #include "supervisor.h"
 
 #include "busconnection.h"
+#include "component.h"
 #include "device.h"
 #include "logtail.h"
 #include "sandbox.h"
@@ -213,6 +214,10 @@ PhoneFiles Supervisor::phoneFiles() const
               .toHex()
               .toStdString()
         + "\n";
+    for (const ComponentType &type : ComponentRegistration::all()) {
+        if (type.addFiles)
+            type.addFiles(m_settings.profile.object, phone);
+    }
     for (const RealDaemon &daemon : m_settings.realDaemons) {
         phone.writableFolders.insert(phone.writableFolders.end(), daemon.folders.begin(),
                                      daemon.folders.end());

@@ -4,6 +4,7 @@
 #include "waiting.h"
 
 #include <corvanemdm/callstatistics.h>
+#include <corvanemdm/certificates.h>
 #include <corvanemdm/networkdatacounter.h>
 #include <corvanemdm/simfilter.h>
 #include <corvanemdm/siminfo.h>
@@ -11,6 +12,8 @@
 #include <QtCore/QUrl>
 
 using Corvane::Mdm::CallStatistics;
+using Corvane::Mdm::CertificateFile;
+using Corvane::Mdm::Certificates;
 using Corvane::Mdm::NetworkDataCounter;
 using Corvane::Mdm::SimFilter;
 using Corvane::Mdm::SimInfo;
@@ -85,6 +88,10 @@ QString text(int type, const void *value)
         return text(*static_cast<const NetworkDataCounter::Update *>(value));
     if (type == qMetaTypeId<QList<QUrl>>())
         return text(*static_cast<const QList<QUrl> *>(value));
+    if (type == qMetaTypeId<CertificateFile>())
+        return static_cast<const CertificateFile *>(value)->fileName();
+    if (type == qMetaTypeId<Certificates::Result>())
+        return QString::number(*static_cast<const Certificates::Result *>(value));
     if (type == QMetaType::UnknownType)
         return QStringLiteral("<type unknown to the meta-object system>");
     return text(QVariant(type, value));
@@ -112,7 +119,8 @@ SignalSequence::SignalSequence(QObject *object)
 {
     const QMetaObject *metaObject = object->metaObject();
     const int firstSlot = QObject::staticMetaObject.methodCount();
-    for (int index = metaObject->methodOffset(); index < metaObject->methodCount(); ++index) {
+    // From all classes but QObject.
+    for (int index = firstSlot; index < metaObject->methodCount(); ++index) {
         const QMetaMethod method = metaObject->method(index);
         if (method.methodType() != QMetaMethod::Signal)
             continue;

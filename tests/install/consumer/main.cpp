@@ -1,13 +1,18 @@
 // SPDX-License-Identifier: LGPL-2.1-or-later
 // Uses every public class from outside of the project. Where no service answers, it must work as well.
 #include <corvanemdm/applications.h>
+#include <corvanemdm/autostart.h>
 #include <corvanemdm/callstatistics.h>
+#include <corvanemdm/certificates.h>
 #include <corvanemdm/connectivitysettings.h>
 #include <corvanemdm/corvanemdm_global.h>
+#include <corvanemdm/emailaccountprovisioner.h>
+#include <corvanemdm/genericaccountprovisioner.h>
 #include <corvanemdm/locationinfo.h>
 #include <corvanemdm/netproxy.h>
 #include <corvanemdm/networkdatacounter.h>
 #include <corvanemdm/notificationinfo.h>
+#include <corvanemdm/provisioner.h>
 #include <corvanemdm/simfilter.h>
 #include <corvanemdm/siminfo.h>
 #include <corvanemdm/simmobiledatafilter.h>
@@ -18,6 +23,8 @@
 #include <QtCore/QCoreApplication>
 #include <QtCore/QDebug>
 #include <QtCore/QTextStream>
+
+#include <algorithm>
 
 using namespace Corvane::Mdm;
 
@@ -63,6 +70,39 @@ bool simVoiceCallFilterWorks()
     QObject::connect(&filter, &SimVoiceCallFilter::readyChanged, &filter, [] {});
     // Not ready before the event loop has run, so that no request is a change.
     return !filter.ready() && filter.dialRules().isEmpty() && !filter.clearIncomingRules();
+}
+
+bool provisionersWork()
+{
+    Accounts::EmailAccountProvisioner email;
+    email.setEmailAddress(QStringLiteral("a@example.org"));
+    Accounts::GenericAccountProvisioner generic;
+    generic.setUsername(QStringLiteral("a"));
+    Accounts::Provisioner &provisioner = generic;
+    // Where nobody answers, an account cannot be deleted either.
+    return !email.canCreateAccount() && !email.createAccount() && email.error() == 1
+        && !provisioner.deleteAccount(0) && provisioner.error() != 0 && !provisioner.errorMessage().isEmpty();
+}
+
+bool certificatesWork()
+{
+    const Certificates certificates;
+    QObject::connect(&certificates, &Certificates::installFinished, &certificates,
+                     [](const CertificateFile &, Certificates::Result) {});
+    const QList<CertificateFile> files = certificates.installedFiles() + certificates.blacklistedFiles();
+    return CertificateFile().isNull()
+        && std::none_of(files.begin(), files.end(),
+                        [](const CertificateFile &file) { return file.isNull(); });
+}
+
+bool autostartWorks()
+{
+    Autostart autostart;
+    Autostart::Result result = Autostart::AlreadyAutostarted;
+    const QStringList entries = autostart.query(result);
+    // Where nobody answers, nothing starts; an application that there is not cannot be added anywhere.
+    return (result == Autostart::InternalError || result == Autostart::Success) && entries.isEmpty()
+        && autostart.add(QStringLiteral("no-such.desktop")) != Autostart::Success;
 }
 
 bool otherFiltersWork()
@@ -146,9 +186,20 @@ QString latestVersion()
 int main(int argc, char **argv)
 {
     QCoreApplication application(argc, argv);
-    const bool works = simFilterWorks() && simVoiceCallFilterWorks() && otherFiltersWork() && simInfoWorks()
-        && connectivitySettingsWork() && callStatisticsWork() && applicationsWork() && notificationInfoWorks()
-        && locationInfoWorks() && netProxyWorks() && networkDataCounterWorks();
+    bool works = simFilterWorks();
+    works = provisionersWork() && works;
+    works = autostartWorks() && works;
+    works = certificatesWork() && works;
+    works = applicationsWork() && works;
+    works = simVoiceCallFilterWorks() && works;
+    works = otherFiltersWork() && works;
+    works = simInfoWorks() && works;
+    works = callStatisticsWork() && works;
+    works = notificationInfoWorks() && works;
+    works = locationInfoWorks() && works;
+    works = connectivitySettingsWork() && works;
+    works = netProxyWorks() && works;
+    works = networkDataCounterWorks() && works;
     QTextStream(stdout) << (works ? "consumer works" : "consumer fails") << ", update: " << latestVersion()
                         << '\n';
     return works ? 0 : 1;
