@@ -323,7 +323,7 @@ void NetworkManager::Private::servicePropertyChanged(const QString &name, const 
 {
     Changes<NetworkService> changes;
     for (NetworkService *service : servicesAt(message.path()))
-        changes.append({service, service->d->set({{name, value.variant()}})});
+        changes.append({service, service->d->setAnnounced({{name, value.variant()}})});
     signalAll(changes);
 }
 

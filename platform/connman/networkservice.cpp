@@ -6,6 +6,8 @@
 #include <QtDBus/QDBusArgument>
 #include <QtDBus/QDBusVariant>
 
+#include <utility>
+
 namespace
 {
 
@@ -33,12 +35,19 @@ NetworkService::Private::Changes NetworkService::Private::set(const QVariantMap 
     type = properties.value(typeProperty, type).toString();
     saved = properties.value(favoriteProperty, saved).toBool();
     if (properties.contains(proxyProperty)) {
-        proxyConfig = toMap(properties.value(proxyProperty));
-        changes |= ProxyConfig;
+        const QVariantMap told = toMap(properties.value(proxyProperty));
+        if (std::exchange(proxyConfig, told) != told)
+            changes |= ProxyConfig;
     }
     if (!name.isEmpty())
         changes |= setLoaded();
     return changes;
+}
+
+NetworkService::Private::Changes NetworkService::Private::setAnnounced(const QVariantMap &properties)
+{
+    const Changes changes = set(properties);
+    return properties.contains(proxyProperty) ? changes | ProxyConfig : changes;
 }
 
 NetworkService::Private::Changes NetworkService::Private::setLoaded()

@@ -19,8 +19,10 @@ public:
     {
     }
 
-    /** Takes over what has been told; what is missing from it stays. */
+    /** Takes over what a list has told; what is missing from it stays. */
     Changes set(const QVariantMap &properties);
+    /** The same with what was announced, which is a change for those who wait for a confirmation. */
+    Changes setAnnounced(const QVariantMap &properties);
     Changes setLoaded();
     void signal(Changes changes);
 

@@ -66,7 +66,7 @@ void RealNetProxyTest::stockDaemonHasNoGlobalProxy()
     QVERIFY(waitUntil([&] { return proxy.getTechnologies().size() > 1; }));
     m_phone.settle(QStringLiteral("org.ofono"));
     QVERIFY(!proxy.isValid());
-    QCOMPARE(proxy.getTechnologies(), list("Wired|global"));
+    QVERIFY(proxy.getTechnologies().contains(QStringLiteral("Wired")));
     QCOMPARE(proxy.getIdentifiers(QStringLiteral("ethernet")).size(), 1);
 }
 
