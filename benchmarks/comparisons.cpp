@@ -41,6 +41,9 @@ constexpr Comparison Comparisons[] = {
     {"proxy of 1 of 1,000 networks selected / walking their list", "selectproxy/library/1000",
      "selectproxy/walk/1000", 0},
     {"1,000 reports on data / reading their numbers", "usage/library/1000", "usage/numbers/1000", 0},
+    {"1,000 notifications with nested actions / plain QtDBus demarshalling", "notifications/library/1000",
+     "notifications/QtDBus/1000", 0},
+    {"1,000 positions / hand-written QtDBus client", "positions/library/1000", "positions/QtDBus/1000", 0},
     {"loading the library / loading its dependencies", "load/library", "load/dependencies", 0},
 };
 
