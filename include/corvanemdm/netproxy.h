@@ -118,14 +118,14 @@ Q_SIGNALS:
     void validChanged(bool valid);
     /** The selected configuration has changed, or the global one is selected and activeType was announced. */
     void proxyConfigChanged();
-    void typeChanged(ProxyType type);
+    void typeChanged(ProxyType type); // clazy:exclude=fully-qualified-moc-types
     void manualProxiesChanged(const QList<QUrl> &proxies);
     /** Follows manualProxiesChanged(). When the exclusions alone have changed, only proxyConfigChanged()
      * tells. */
     void manualExclusionsChanged(const QStringList &exclusions);
     void automaticUrlChanged(const QUrl &url);
     /** It was announced, perhaps as what it has been before. */
-    void activeTypeChanged(ActiveType type);
+    void activeTypeChanged(ActiveType type); // clazy:exclude=fully-qualified-moc-types
 
 private:
     Q_DISABLE_COPY(NetProxy)

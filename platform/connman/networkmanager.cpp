@@ -208,7 +208,8 @@ void NetworkManager::Private::load(const QString &path)
             if (reply.isError())
                 return; // it has gone meanwhile
             Changes<NetworkService> changes;
-            for (NetworkService *service : servicesAt(path))
+            const QVector<NetworkService *> loaded = servicesAt(path);
+            for (NetworkService *service : loaded)
                 changes.append({service, service->d->set(reply.value()) | service->d->setLoaded()});
             signalAll(changes);
         });
@@ -322,7 +323,8 @@ void NetworkManager::Private::servicePropertyChanged(const QString &name, const 
                                                      const QDBusMessage &message)
 {
     Changes<NetworkService> changes;
-    for (NetworkService *service : servicesAt(message.path()))
+    const QVector<NetworkService *> changed = servicesAt(message.path());
+    for (NetworkService *service : changed)
         changes.append({service, service->d->setAnnounced({{name, value.variant()}})});
     signalAll(changes);
 }

@@ -22,7 +22,8 @@ const QLatin1String automaticMethod("auto");
 QStringList toList(const QJsonValue &array)
 {
     QStringList list;
-    for (const QJsonValue &item : array.toArray())
+    const QJsonArray items = array.toArray();
+    for (const QJsonValue &item : items)
         list << item.toString();
     return list;
 }

@@ -104,6 +104,7 @@ private Q_SLOTS:
     void registersCounters();
     void refusalsAreLogged();
     void requestsToNobodyAreLogged();
+    void networkThatVanishesDuringARequest();
 
 private:
     void act(const char *action, const QStringList &arguments)
@@ -633,6 +634,30 @@ void ConnManClientsTest::requestsToNobodyAreLogged()
     QCOMPARE(log.takeWarnings(),
              QStringList(QStringLiteral("The connection manager is away: \"SetProperty\" of \"/\"")));
     QVERIFY(!manager->offlineMode());
+}
+
+void ConnManClientsTest::networkThatVanishesDuringARequest()
+{
+    QVERIFY(validManager());
+    NetworkService *home = saved(Home);
+    QSignalSpy destroyed(home, &QObject::destroyed);
+    m_phone->delayCalls(Service, Prefix + Home, QStringLiteral("SetProperty"), 50);
+    MessageLog log;
+    home->setProxyConfig(Manual);
+    home->setProxyConfig({});
+    settle();
+    act("connection vanish", {Home});
+    QVERIFY(waitUntil([&] { return destroyed.size() == 1; }));
+    // The answers still come, and nobody minds.
+    QStringList warnings;
+    QVERIFY(waitUntil([&] {
+        warnings += log.takeWarnings();
+        return !warnings.isEmpty();
+    }));
+    QVERIFY(warnings.first().contains(QLatin1String("net.connman.Error.InvalidArguments")));
+    act("connection return", {Home});
+    QVERIFY(waitUntil([&] { return saved(Home) != nullptr; }));
+    QCOMPARE(saved(Home)->proxyConfig(), Manual);
 }
 
 QTEST_GUILESS_MAIN(ConnManClientsTest)
