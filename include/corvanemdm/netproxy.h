@@ -37,13 +37,19 @@ class NetProxyPrivate;
 class CORVANEMDM_EXPORT NetProxy : public QObject
 {
     Q_OBJECT
+    /** Whether the connection manager is there and the global proxy has been read. */
     Q_PROPERTY(bool valid READ isValid NOTIFY validChanged)
+    /** How traffic finds its proxy; of what is selected. */
     Q_PROPERTY(Corvane::Mdm::NetProxy::ProxyType type READ type WRITE setType NOTIFY typeChanged)
+    /** The proxy servers of the type Manual; of what is selected. */
     Q_PROPERTY(
         QList<QUrl> manualProxies READ manualProxies WRITE setManualProxies NOTIFY manualProxiesChanged)
+    /** What the type Manual leaves out; of what is selected. */
     Q_PROPERTY(QStringList manualExclusions READ manualExclusions WRITE setManualExclusions NOTIFY
                    manualExclusionsChanged)
+    /** Where the script of the type Automatic is; of what is selected. */
     Q_PROPERTY(QUrl automaticUrl READ automaticUrl WRITE setAutomaticUrl NOTIFY automaticUrlChanged)
+    /** Whose configuration is in use, whatever is selected. */
     Q_PROPERTY(Corvane::Mdm::NetProxy::ActiveType activeType READ activeType WRITE setActiveType NOTIFY
                    activeTypeChanged)
 
@@ -64,6 +70,7 @@ public:
     };
     Q_ENUM(ActiveType)
 
+    /** Asks for the global proxy; nothing is selected yet. */
     explicit NetProxy(QObject *parent = nullptr);
     ~NetProxy() override;
 
@@ -71,6 +78,7 @@ public:
     bool isValid() const;
 
     // Of what is selected. Without a selection the getters return empty values, and the setters false.
+    /** How traffic finds its proxy. */
     ProxyType type() const;
     /** Returns whether this is a change; it is sent in any case. Invalid is refused. */
     bool setType(ProxyType type);
@@ -90,6 +98,7 @@ public:
     bool setAutomaticUrl(const QUrl &url);
 
     // Of the phone, whatever is selected.
+    /** Whose configuration is in use. */
     ActiveType activeType() const;
     /** Returns whether this is a change; activeType() is changed at once. */
     bool setActiveType(ActiveType type);
@@ -115,14 +124,18 @@ public:
     QStringList getTechnologies() const;
 
 Q_SIGNALS:
+    /** The object has become valid, or invalid. */
     void validChanged(bool valid);
     /** The selected configuration has changed, or the global one is selected and activeType was announced. */
     void proxyConfigChanged();
+    /** The type is another one, or a change of it has been confirmed. */
     void typeChanged(ProxyType type); // clazy:exclude=fully-qualified-moc-types
+    /** The servers are others, or a change of them has been confirmed. */
     void manualProxiesChanged(const QList<QUrl> &proxies);
     /** Follows manualProxiesChanged(). When the exclusions alone have changed, only proxyConfigChanged()
      * tells. */
     void manualExclusionsChanged(const QStringList &exclusions);
+    /** The URL is another one, or a change of it has been confirmed. */
     void automaticUrlChanged(const QUrl &url);
     /** It was announced, perhaps as what it has been before. */
     void activeTypeChanged(ActiveType type); // clazy:exclude=fully-qualified-moc-types

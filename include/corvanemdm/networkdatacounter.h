@@ -32,8 +32,11 @@ class NetworkDataCounterPrivate;
 class CORVANEMDM_EXPORT NetworkDataCounter : public QObject
 {
     Q_OBJECT
+    /** Seconds from report to report. */
     Q_PROPERTY(int updateInterval READ updateInterval WRITE setUpdateInterval NOTIFY updateIntervalChanged)
+    /** KiB from report to report. */
     Q_PROPERTY(int updateAccuracy READ updateAccuracy WRITE setUpdateAccuracy NOTIFY updateAccuracyChanged)
+    /** Whether the connection manager reports. */
     Q_PROPERTY(bool active READ active WRITE setActive NOTIFY activeChanged)
 
 public:
@@ -48,12 +51,13 @@ public:
     /** @brief A report on one network: totals since the last reset. A number that was not reported is 0. */
     struct Update {
         QString identifier; ///< of the network, as NetProxy has them
-        NetworkType type = Wlan;
+        NetworkType type = Wlan; ///< what carried the data
         quint64 txBytes = 0; ///< sent
         quint64 rxBytes = 0; ///< received
         quint64 time = 0; ///< seconds of being connected
     };
 
+    /** Offers the object that the connection manager calls. A bus that refuses it is logged. */
     explicit NetworkDataCounter(QObject *parent = nullptr);
     ~NetworkDataCounter() override;
 
@@ -67,6 +71,7 @@ public:
     /** From the next activation on. Less than 1 is only logged ("Invalid update accuracy"). */
     void setUpdateAccuracy(int accuracy);
 
+    /** Whether the connection manager reports. */
     bool active() const;
     /** Without the connection manager a counter that is switched on is inactive again at once; both is
      * signalled. */
@@ -79,8 +84,11 @@ public:
     void resetCounter(const QString &servicePath);
 
 Q_SIGNALS:
+    /** Another interval has been set. */
     void updateIntervalChanged();
+    /** Another accuracy has been set. */
     void updateAccuracyChanged();
+    /** It was switched, or the connection manager has gone or dropped it. */
     void activeChanged();
     /** A report in which something is counted. One on mobile data at home comes before one on roaming. */
     void counterUpdate(const NetworkDataCounter::Update &update);
