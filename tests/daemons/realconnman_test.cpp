@@ -5,6 +5,7 @@
 #include "waiting.h"
 
 #include <corvanemdm/connectivitysettings.h>
+#include <corvanemdm/netproxy.h>
 
 #include <connman/networkmanager.h>
 #include <connman/networkservice.h>
@@ -15,6 +16,7 @@
 #include <memory>
 
 using Corvane::Mdm::ConnectivitySettings;
+using Corvane::Mdm::NetProxy;
 
 namespace
 {
@@ -40,6 +42,7 @@ private Q_SLOTS:
     void clientsKnowTheWiredNetwork();
     void clientsConfigureProxies();
     void clientsFollowARestart();
+    void proxiesNeedTheGlobalOne();
 
 private:
     Phone m_phone;
@@ -197,6 +200,19 @@ void RealConnmanTest::clientsFollowARestart()
     m_phone.startService(Connman);
     QCOMPARE(wiredNetwork()->path(), path);
     QVERIFY(manager->getTechnology(QStringLiteral("ethernet")));
+}
+
+void RealConnmanTest::proxiesNeedTheGlobalOne()
+{
+    // The global proxy is a plug-in of phones, which the distribution's ConnMan lacks.
+    NetProxy proxy;
+    const QString identifier = wiredNetwork()->path().section(QLatin1Char('/'), -1);
+    m_phone.settle(Connman);
+    QVERIFY(!proxy.isValid());
+    QCOMPARE(proxy.type(), NetProxy::Invalid);
+    QVERIFY(!proxy.selectProxy(identifier));
+    QVERIFY(!proxy.setType(NetProxy::Manual));
+    QCOMPARE(proxy.getIdentifier(), QString());
 }
 
 QTEST_GUILESS_MAIN(RealConnmanTest)
