@@ -27,6 +27,11 @@ Service Service::mdmProxy()
     return {QStringLiteral("org.corvaneos.mdmproxy"), QStringLiteral("MDM proxy")};
 }
 
+Service Service::packageKit()
+{
+    return {QStringLiteral("org.freedesktop.PackageKit"), QStringLiteral("package manager")};
+}
+
 QString Service::toString() const
 {
     return QStringLiteral("the %1 (%2)").arg(description, name);
@@ -57,6 +62,11 @@ Reply Service::ensureRunning() const
 Reply Service::notRunning() const
 {
     return {Reply::ServiceLost, toString() + QLatin1String(" is not running")};
+}
+
+QString Service::refusal(const QString &reason) const
+{
+    return QStringLiteral("%1 refused: %2").arg(toString(), reason);
 }
 
 } // namespace Agent

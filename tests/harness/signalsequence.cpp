@@ -84,14 +84,14 @@ QString text(int type, const void *value)
         return text(*static_cast<const QList<CallStatistics::Result> *>(value));
     if (type == qMetaTypeId<SimInfo::SimState>())
         return simStateText(*static_cast<const SimInfo::SimState *>(value));
-    if (type == qMetaTypeId<NetworkDataCounter::Update>())
-        return text(*static_cast<const NetworkDataCounter::Update *>(value));
-    if (type == qMetaTypeId<QList<QUrl>>())
-        return text(*static_cast<const QList<QUrl> *>(value));
     if (type == qMetaTypeId<CertificateFile>())
         return static_cast<const CertificateFile *>(value)->fileName();
     if (type == qMetaTypeId<Certificates::Result>())
         return QString::number(*static_cast<const Certificates::Result *>(value));
+    if (type == qMetaTypeId<NetworkDataCounter::Update>())
+        return text(*static_cast<const NetworkDataCounter::Update *>(value));
+    if (type == qMetaTypeId<QList<QUrl>>())
+        return text(*static_cast<const QList<QUrl> *>(value));
     if (type == QMetaType::UnknownType)
         return QStringLiteral("<type unknown to the meta-object system>");
     return text(QVariant(type, value));

@@ -2,13 +2,16 @@
 // Uses every public class from outside of the project. Where no service answers, it must work as well.
 #include <corvanemdm/applications.h>
 #include <corvanemdm/autostart.h>
+#include <corvanemdm/batteryinfo.h>
 #include <corvanemdm/callstatistics.h>
 #include <corvanemdm/certificates.h>
 #include <corvanemdm/connectivitysettings.h>
 #include <corvanemdm/corvanemdm_global.h>
+#include <corvanemdm/datetimesettings.h>
 #include <corvanemdm/emailaccountprovisioner.h>
 #include <corvanemdm/genericaccountprovisioner.h>
 #include <corvanemdm/locationinfo.h>
+#include <corvanemdm/locationsettings.h>
 #include <corvanemdm/netproxy.h>
 #include <corvanemdm/networkdatacounter.h>
 #include <corvanemdm/notificationinfo.h>
@@ -25,6 +28,7 @@
 #include <QtCore/QTextStream>
 
 #include <algorithm>
+#include <iterator>
 
 using namespace Corvane::Mdm;
 
@@ -173,6 +177,32 @@ bool networkDataCounterWorks()
     return !counter.active() && counter.updateInterval() == 5 && updates == 0;
 }
 
+bool locationSettingsWork()
+{
+    const LocationSettings settings;
+    QObject::connect(&settings, &LocationSettings::locationEnabledChanged, &settings, [] {});
+    const LocationSettings::DataSources satellites = LocationSettings::GpsData | LocationSettings::SbasData;
+    return satellites.testFlag(LocationSettings::GpsData)
+        && settings.availableAgpsProviders().contains(QStringLiteral("here"))
+        == settings.agpsAvailable(QStringLiteral("here"));
+}
+
+bool dateTimeSettingsWork()
+{
+    DateTimeSettings settings;
+    QObject::connect(&settings, &DateTimeSettings::timeZoneChanged, &settings, [] {});
+    // Nothing is known before the event loop has run.
+    return !settings.ready() && settings.timeZone().isEmpty()
+        && settings.supportedTimeZones().contains(QStringLiteral("Europe/Helsinki"));
+}
+
+bool batteryInfoWorks()
+{
+    const BatteryInfo battery;
+    QObject::connect(&battery, &BatteryInfo::chargePercentageChanged, &battery, [](int) {});
+    return battery.chargePercentage() == -1 && battery.status() == BatteryInfo::BatteryStatusUnknown;
+}
+
 QString latestVersion()
 {
     const SoftwareUpdate update;
@@ -186,20 +216,15 @@ QString latestVersion()
 int main(int argc, char **argv)
 {
     QCoreApplication application(argc, argv);
-    bool works = simFilterWorks();
-    works = provisionersWork() && works;
-    works = autostartWorks() && works;
-    works = certificatesWork() && works;
-    works = applicationsWork() && works;
-    works = simVoiceCallFilterWorks() && works;
-    works = otherFiltersWork() && works;
-    works = simInfoWorks() && works;
-    works = callStatisticsWork() && works;
-    works = notificationInfoWorks() && works;
-    works = locationInfoWorks() && works;
-    works = connectivitySettingsWork() && works;
-    works = netProxyWorks() && works;
-    works = networkDataCounterWorks() && works;
+    bool (*const checks[])() = {
+        simFilterWorks,          simInfoWorks,         connectivitySettingsWork, simVoiceCallFilterWorks,
+        otherFiltersWork,        callStatisticsWork,   applicationsWork,         notificationInfoWorks,
+        locationInfoWorks,       locationSettingsWork, dateTimeSettingsWork,     batteryInfoWorks,
+        provisionersWork,        autostartWorks,       certificatesWork,         netProxyWorks,
+        networkDataCounterWorks,
+    };
+    const bool works
+        = std::all_of(std::begin(checks), std::end(checks), [](bool (*check)()) { return check(); });
     QTextStream(stdout) << (works ? "consumer works" : "consumer fails") << ", update: " << latestVersion()
                         << '\n';
     return works ? 0 : 1;
