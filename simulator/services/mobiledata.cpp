@@ -113,7 +113,8 @@ ContextStore::ContextStore(const QJsonArray &sims)
         if (!accessPoints.isArray())
             continue;
         List &list = m_contexts[sim.toObject().value(QLatin1String("imsi")).toString()];
-        for (const QJsonValue &accessPoint : accessPoints.toArray())
+        const QJsonArray described = accessPoints.toArray();
+        for (const QJsonValue &accessPoint : described)
             append(list, accessPoint.toObject());
     }
 }

@@ -40,8 +40,9 @@ QStringList Modem::technologiesOf(const QJsonObject &slotProfile)
     const QJsonValue listed = slotProfile.value(QLatin1String("technologies"));
     if (!listed.isArray())
         return {QStringLiteral("gsm"), QStringLiteral("umts"), QStringLiteral("lte")};
+    const QJsonArray words = listed.toArray();
     QStringList technologies;
-    for (const QJsonValue &technology : listed.toArray())
+    for (const QJsonValue &technology : words)
         technologies << technology.toString();
     return technologies;
 }
