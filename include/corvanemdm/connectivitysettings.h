@@ -168,7 +168,9 @@ public:
     bool isConnectedToMobileNetwork(const QString &imsi) const;
 
     /**
-     * Brings mobile data up through a SIM, and lets it come up by itself from now on; blocks.
+     * Brings mobile data up through a SIM, and lets it come up by itself from now on; blocks. A connection
+     * manager that keeps this choice only for networks it has connected before refuses it the first time,
+     * which is a warning.
      * @return whether it is up or, when the connection manager has only agreed to try, whether it will come
      * up by itself too. The reason otherwise is a warning.
      */
@@ -182,7 +184,9 @@ public:
     bool disconnectFromMobileNetwork(const QString &imsi);
 
     /**
-     * Reads the access points of a SIM; blocks. Makes the SIM the one for mobile data.
+     * Reads the access points of a SIM; blocks. Makes the SIM the one for mobile data, which a telephony
+     * service without the extension has no way to do: there (with a warning) no access point can be read or
+     * written.
      * @return by type; of several of the same type the last one. Those that cannot be read are left out (with
      * a warning). Empty for an unknown SIM.
      */
