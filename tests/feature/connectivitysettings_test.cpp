@@ -192,6 +192,7 @@ private Q_SLOTS:
     void strangeAccessPoints();
     void laterAccessPointsReplaceEarlierOnes();
     void accessPointsWithoutTheDataSim();
+    void mobileDataOfAStockService();
     void accessPointThatCannotBeRead();
     void accessPointsOfNobody();
     void validAccessPoints();
@@ -705,6 +706,26 @@ void ConnectivitySettingsTest::accessPointsWithoutTheDataSim()
     QCOMPARE(textsOf(settings.accessPointSettings(FirstImsi)),
              texts({"0=0|Elo Internet|internet.elo|||0|0||"}));
     QCOMPARE(m_log->takeWarnings(), QStringList(warning));
+}
+
+void ConnectivitySettingsTest::mobileDataOfAStockService()
+{
+    ConnectivitySettings settings;
+    m_phone->act(QStringLiteral("phone extensions"), {QStringLiteral("off")});
+    QCOMPARE(settings.supportedCellularTechnologies(FirstModem).size(), 3);
+    QVERIFY(settings.connectToMobileNetwork(FirstImsi));
+    QVERIFY(settings.isConnectedToMobileNetwork(FirstImsi));
+    QVERIFY(settings.disconnectFromMobileNetwork(FirstImsi));
+    QCOMPARE(m_log->takeWarnings(), QStringList());
+
+    // Nobody there could make the SIM the one for mobile data.
+    QVERIFY(settings.accessPointSettings(FirstImsi).isEmpty());
+    QVERIFY(!settings.setAccessPointSettings(FirstImsi, companyAccessPoint()));
+    m_phone->act(QStringLiteral("phone extensions"), {QStringLiteral("on")});
+    const QStringList warnings = m_log->takeWarnings();
+    QCOMPARE(warnings.size(), 2);
+    for (const QString &warning : warnings)
+        QVERIFY(warning.startsWith(QLatin1String("Unable to set the default data SIM: \"")));
 }
 
 void ConnectivitySettingsTest::accessPointThatCannotBeRead()
