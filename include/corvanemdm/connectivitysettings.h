@@ -61,6 +61,7 @@ public:
         Technology5G = 8 ///< never among the supported ones
     };
     Q_ENUM(CellularTechnology)
+    /** A set of generations. */
     Q_DECLARE_FLAGS(CellularTechnologies, CellularTechnology)
     Q_FLAG(CellularTechnologies)
 
