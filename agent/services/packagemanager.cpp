@@ -21,8 +21,9 @@ using Mdm::PackageEntry;
 namespace
 {
 
-// The reason comes with the operation as well.
-const QLatin1String toldTwice("^Error (un)?installing package ");
+// The reason comes with the operation as well; and PackageKit's client library wonders at its own daemon.
+const QLatin1String noNews(
+    "^Error (un)?installing package |^Cannot process \"org\\.freedesktop\\.PackageKit");
 
 template <typename Entry> QList<Entry> byName(QList<Entry> entries)
 {
@@ -82,7 +83,7 @@ void PackageManager::transactionListChanged(const QStringList &transactions)
 Reply PackageManager::perform(const QString &awaited, const std::function<ApplicationOperation *()> &request)
 {
     Wait wait(Service::packageKit(), m_timeout, awaited);
-    const WarningCapture toldAlready(toldTwice, [](const QString &) {});
+    const WarningCapture toldAlready(noNews, [](const QString &) {});
     connect(request(), &ApplicationOperation::finished, &wait, [&wait](ApplicationOperation *operation) {
         const Reply outcome = outcomeOf(operation);
         wait.end(outcome.outcome, outcome.text);

@@ -144,6 +144,32 @@ phone_is_its_own() {
         2>&1 | grep -c 'Read-only')" 1
 }
 
+packages_are_the_phones() {
+    expect "desktop entries that are the machine's" \
+        "$(phone sh -c 'ls /usr/share/applications | grep -vE "^(corvane|tarn|desk)-"')" ""
+    expect "icon themes" "$(phone sh -c 'cd /usr/share/icons; echo *')" "default hicolor"
+    expect "package" "$(phone rpm -q corvane-browser)" corvane-browser-5.0.3-1.noarch
+    expect "owner of a file" "$(phone rpm -qf /usr/share/applications/tarn-chess.desktop)" tarn-chess-1.0.7-1.noarch
+    expect "needed package" "$(phone rpm -q --whatprovides corvane-webengine)" corvane-webengine-91.4.0-1.noarch
+    expect "installation" "$(phone sh -c 'mdmctl install corvane-notes && rpm -q corvane-notes; ls /usr/share/applications' |
+        grep notes)" $'corvane-notes is installed.\ncorvane-notes-1.4.0-1.noarch\ncorvane-notes.desktop'
+    expect "removal" "$(phone sh -c 'mdmctl remove tarn-chess; rpm -q tarn-chess; ls /usr/share/applications | grep tarn')" \
+        $'tarn-chess is removed.\npackage tarn-chess is not installed'
+    # Packages other than the built-in phone's take a database made at the start.
+    cat >packages.json <<'END'
+{ "packages": { "installed": [ { "name": "a", "version": "1", "files": ["/etc/a.conf"] } ], "available": [] } }
+END
+    expect "packages of a profile" "$("$simulator" --device packages.json -- rpm -qa)" a-1-1.noarch
+    expect "its file" "$("$simulator" --device packages.json -- sh -c 'rpm -qf /etc/a.conf; cat /etc/a.conf')" \
+        $'a-1-1.noarch\nof a'
+    echo '{ "packages": { "installed": [ { "name": "a", "version": "1", "requires": ["b"] } ] } }' >wrong.json
+    expect "a package that is missing" "$("$simulator" --device wrong.json true 2>&1)" \
+        "corvane-simulator: wrong.json: /packages/installed/0/requires: b is not installed"
+    echo '{ "packages": { "available": [ { "name": "a", "version": "1" }, { "name": "a", "version": "1" } ] } }' >wrong.json
+    expect "a version twice" "$("$simulator" --device wrong.json true 2>&1)" \
+        "corvane-simulator: wrong.json: /packages/available/1: a 1-1 is there already; each is allowed once"
+}
+
 environment_is_the_phones() {
     local seen
     seen=$(DBUS_SYSTEM_BUS_ADDRESS=unix:path=/elsewhere DBUS_SESSION_BUS_ADDRESS=unix:path=/elsewhere phone env)
@@ -349,7 +375,7 @@ failed_set_up_is_told() {
 
 printf '%s' '{"name": "nested"}' >"$work/nested.json"
 for test in exit_status_is_passed_on command_line_is_the_commands changes_vanish machine_is_the_same_meanwhile \
-    folder_is_kept phone_is_its_own environment_is_the_phones capabilities_are_dropped signals_reach_the_command \
+    folder_is_kept phone_is_its_own packages_are_the_phones environment_is_the_phones capabilities_are_dropped signals_reach_the_command \
     nothing_survives kill_takes_everything_down two_phones_are_apart phones_nest \
     control_c_reaches_the_command_alone shell_has_job_control refusals_help failed_set_up_is_told; do
     failures_before=$failures
