@@ -155,6 +155,15 @@ private Q_SLOTS:
     void failuresOfEachPhase();
     void callsThatFail_data();
     void callsThatFail();
+    void exitsWithoutAReason_data();
+    void exitsWithoutAReason();
+    void errorsOfEachPhase_data();
+    void errorsOfEachPhase();
+    void transactionThatVanishes_data();
+    void transactionThatVanishes();
+    void laterMatchReplacesAnEarlierOne();
+    void whatComesAfterTheEndIsIgnored();
+    void debugTexts();
     void daemonThatIsNotThere();
     void daemonThatGoes_data();
     void daemonThatGoes();
@@ -171,8 +180,34 @@ private Q_SLOTS:
     void worksThroughTheMetaObject();
 
 private:
+    /** Lets @p member go unanswered, so that the test can tell how its transaction ends. */
+    void takeOver(const QString &member) { m_phone->swallowCalls(Service, QString(), member); }
+    /** The path of the transaction that was asked for @p member, once it was. */
+    QString transactionOf(const QString &member);
+    void tell(const QString &transaction, const char *signal, const QVariantList &arguments = QVariantList());
+
     std::unique_ptr<Phone> m_phone;
 };
+
+QString ApplicationsTest::transactionOf(const QString &member)
+{
+    QString path;
+    waitUntil([&] {
+        const QStringList calls = m_phone->takeJournal(Service);
+        for (const QString &call : calls) {
+            if (call.section(QLatin1Char(' '), 1, 1) == member)
+                path = call.section(QLatin1Char(' '), 0, 0);
+        }
+        return !path.isEmpty();
+    });
+    return path;
+}
+
+void ApplicationsTest::tell(const QString &transaction, const char *signal, const QVariantList &arguments)
+{
+    m_phone->emitSignal(Service, transaction, QStringLiteral("org.freedesktop.PackageKit.Transaction"),
+                        QLatin1String(signal), arguments);
+}
 
 void ApplicationsTest::init()
 {
@@ -616,6 +651,177 @@ void ApplicationsTest::callsThatFail()
     operation = install ? applications.installPackage(QStringLiteral("no-such-package"))
                         : applications.removePackage(QStringLiteral("no-such-package"));
     QCOMPARE(Outcome(operation).wait(), failedWith("Package not found: no-such-package"));
+}
+
+namespace
+{
+
+/** What PackageKit is asked for in each phase of a request. */
+void addPhases()
+{
+    QTest::addColumn<QString>("member");
+    QTest::addColumn<bool>("install");
+    QTest::newRow("refresh") << "RefreshCache" << true;
+    QTest::newRow("resolving for an install") << "Resolve" << true;
+    QTest::newRow("install") << "InstallPackages" << true;
+    QTest::newRow("resolving for a removal") << "Resolve" << false;
+    QTest::newRow("removal") << "RemovePackages" << false;
+}
+
+ApplicationOperation *request(Applications *applications, bool install)
+{
+    return install ? applications->installPackage(QStringLiteral("acme-certificates"))
+                   : applications->removePackage(QStringLiteral("corvane-notes"));
+}
+
+constexpr uint SuccessfulExit = 1;
+constexpr uint FailedExit = 2;
+constexpr uint AvailableInfo = 2;
+constexpr uint NoNetwork = 2;
+
+} // namespace
+
+void ApplicationsTest::exitsWithoutAReason_data()
+{
+    addPhases();
+}
+
+void ApplicationsTest::exitsWithoutAReason()
+{
+    QFETCH(QString, member);
+    QFETCH(bool, install);
+    Applications applications;
+    MessageLog log;
+    // Anything that is no success, also numbers that nobody knows.
+    for (const uint exit : {FailedExit, 3u, 8u, 0u, 99u}) {
+        takeOver(member);
+        Outcome outcome(request(&applications, install));
+        const QString transaction = transactionOf(member);
+        QVERIFY(outcome.isPending());
+        tell(transaction, "Finished", {exit, 0u});
+        QCOMPARE(outcome.wait(), Failed);
+        m_phone->clearFaults();
+    }
+    QCOMPARE(log.takeWarnings(), QStringList());
+}
+
+void ApplicationsTest::errorsOfEachPhase_data()
+{
+    addPhases();
+}
+
+void ApplicationsTest::errorsOfEachPhase()
+{
+    QFETCH(QString, member);
+    QFETCH(bool, install);
+    const bool isLast = member.endsWith(QLatin1String("Packages"));
+    Applications applications;
+    takeOver(member);
+    MessageLog log;
+    Outcome outcome(request(&applications, install));
+    const QString transaction = transactionOf(member);
+    tell(transaction, "ErrorCode", {NoNetwork, QStringLiteral("The cable is out")});
+    // An error is not the end yet.
+    QVERIFY(outcome.isPending());
+    const QString warning = install
+        ? QStringLiteral("Error installing package : PackageKit::Transaction::ErrorNoNetwork")
+        : QStringLiteral("Error uninstalling package : PackageKit::Transaction::ErrorNoNetwork");
+    QCOMPARE(log.takeWarnings(), isLast ? QStringList(warning) : QStringList());
+    tell(transaction, "Finished", {FailedExit, 0u});
+    QCOMPARE(outcome.wait(), isLast ? failedWith("The cable is out") : Failed);
+}
+
+void ApplicationsTest::transactionThatVanishes_data()
+{
+    addPhases();
+}
+
+void ApplicationsTest::transactionThatVanishes()
+{
+    QFETCH(QString, member);
+    QFETCH(bool, install);
+    Applications applications;
+    takeOver(member);
+    MessageLog log;
+    Outcome outcome(request(&applications, install));
+    tell(transactionOf(member), "Destroy");
+    const QString end = outcome.wait();
+    QVERIFY2(end.startsWith(Failed), qPrintable(end));
+}
+
+void ApplicationsTest::laterMatchReplacesAnEarlierOne()
+{
+    Applications applications;
+    takeOver(QStringLiteral("Resolve"));
+    takeOver(QStringLiteral("InstallPackages"));
+    MessageLog log;
+    Outcome any(applications.installPackage(QStringLiteral("acme-mail")));
+    QString transaction = transactionOf(QStringLiteral("Resolve"));
+    const auto report = [&](const char *id) {
+        tell(transaction, "Package", {AvailableInfo, QString::fromLatin1(id), QString()});
+    };
+    report("acme-mail;2.0-1;noarch;first");
+    report("acme-mail;1.0-1;noarch;second");
+    tell(transaction, "Finished", {SuccessfulExit, 0u});
+    const auto installed = [this] {
+        QString call;
+        waitUntil([&] {
+            call = m_phone->takeJournal(Service)
+                       .filter(QStringLiteral("InstallPackages"))
+                       .join(QLatin1Char(' '));
+            return !call.isEmpty();
+        });
+        return call.section(QLatin1Char('['), 1).section(QLatin1Char(']'), 0, 0);
+    };
+    QCOMPARE(installed(), QStringLiteral("'acme-mail;1.0-1;noarch;second'"));
+
+    // With a version, only those of it.
+    Outcome versioned(applications.installPackage(QStringLiteral("acme-agent"), QStringLiteral("2.0-1")));
+    transaction = transactionOf(QStringLiteral("Resolve"));
+    report("acme-agent;2.0-1;noarch;first");
+    report("acme-agent;2.0-1;noarch;second");
+    report("acme-agent;2.0-10;noarch;third");
+    report("acme-agent");
+    report("");
+    tell(transaction, "Finished", {SuccessfulExit, 0u});
+    QCOMPARE(installed(), QStringLiteral("'acme-agent;2.0-1;noarch;second'"));
+}
+
+void ApplicationsTest::whatComesAfterTheEndIsIgnored()
+{
+    Applications applications;
+    takeOver(QStringLiteral("RefreshCache"));
+    MessageLog log;
+    Outcome outcome(applications.installPackage(QStringLiteral("acme-certificates")));
+    const QString transaction = transactionOf(QStringLiteral("RefreshCache"));
+    for (const char *signal : {"Finished", "Finished"})
+        m_phone->sendSignal(Service, transaction, QStringLiteral("org.freedesktop.PackageKit.Transaction"),
+                            QLatin1String(signal), {FailedExit, 0u});
+    m_phone->sendSignal(Service, transaction, QStringLiteral("org.freedesktop.PackageKit.Transaction"),
+                        QStringLiteral("ErrorCode"), {NoNetwork, QStringLiteral("Too late")});
+    m_phone->settle(Service);
+    QCOMPARE(outcome.wait(), Failed);
+}
+
+void ApplicationsTest::debugTexts()
+{
+    Applications applications;
+    for (const auto &[member, install, text] : {std::tuple("RefreshCache", true, "Error refreshing cache"),
+                                                std::tuple("Resolve", true, "Error resolving package"),
+                                                std::tuple("Resolve", false, "Error resolving package")}) {
+        m_phone->failCalls(Service, QString(), QLatin1String(member), QStringLiteral("com.example.Broken"),
+                           QStringLiteral("Out of order"));
+        const QByteArray expected
+            = QByteArray(text) + " PackageKit::Transaction::ErrorInternalError \"Out of order\"";
+        QTest::ignoreMessage(QtDebugMsg, expected.constData());
+        QCOMPARE(Outcome(request(&applications, install)).wait(), Failed);
+        m_phone->clearFaults();
+    }
+    QTest::ignoreMessage(QtDebugMsg, "Uninstalling  \"corvane-base;4.0.2-1;noarch;installed\"");
+    QTest::ignoreMessage(
+        QtWarningMsg, "Error uninstalling package : PackageKit::Transaction::ErrorCannotRemoveSystemPackage");
+    QCOMPARE(Outcome(applications.removePackage(QStringLiteral("corvane-base"))).wait(),
+             failedWith("corvane-base is essential to the phone"));
 }
 
 void ApplicationsTest::daemonThatIsNotThere()
