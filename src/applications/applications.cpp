@@ -9,6 +9,10 @@
 
 #include <QtCore/QDebug>
 #include <QtCore/QDir>
+#include <QtCore/QMetaEnum>
+
+#include <cstring>
+#include <utility>
 
 namespace Corvane
 {
@@ -34,6 +38,25 @@ void registerTypes()
     qRegisterMetaType<ApplicationOperation *>("Corvane::Mdm::ApplicationOperation*");
     // The signals are declared with the short spelling; connections by name and queued ones look it up.
     qRegisterMetaType<ApplicationOperation *>("ApplicationOperation*");
+}
+
+/** What is behind an enumerator. The wire brings any number, and one that nobody knows is no value of the
+ * type. */
+template <typename Enum> int numberOf(const Enum &enumerator)
+{
+    int number = 0;
+    static_assert(sizeof enumerator == sizeof number);
+    std::memcpy(&number, &enumerator, sizeof number);
+    return number;
+}
+
+/** As QDebug writes the enumerator. */
+QString textOf(const Transaction::Error &error)
+{
+    const int number = numberOf(error);
+    const QString key = QString::fromLatin1(QMetaEnum::fromType<Transaction::Error>().valueToKey(number));
+    return QLatin1String("PackageKit::Transaction::")
+        + (key.isEmpty() ? QStringLiteral("Error(%1)").arg(number) : key);
 }
 
 bool isVisible(const MDesktopEntry &entry)
@@ -221,15 +244,14 @@ ApplicationOperation *ApplicationsPrivate::install(const QString &name, const QS
     }
 
     const RequestPointer request = accept(m_installs, operation);
-    const auto logRefreshError = [](const Request &, Transaction::Error error, const QString &details) {
-        qDebug() << "Error refreshing cache" << error << details;
+    const auto logRefreshError = [](const Request &, const QString &error, const QString &details) {
+        qDebug() << "Error refreshing cache" << qPrintable(error) << details;
     };
-    const auto takeInstallError
-        = [](const Request &failed, Transaction::Error error, const QString &details) {
-              qWarning() << "Error installing package"
-                         << ":" << error;
-              failed.operation->setError(details);
-          };
+    const auto takeInstallError = [](const Request &failed, const QString &error, const QString &details) {
+        qWarning() << "Error installing package"
+                   << ":" << qPrintable(error);
+        failed.operation->setError(details);
+    };
     const auto installFound = [this, request, takeInstallError](const QString &packageId) {
         follow(request, Daemon::installPackage(packageId, Transaction::TransactionFlagOnlyTrusted),
                takeInstallError, [request] { succeed(request); });
@@ -253,9 +275,9 @@ ApplicationOperation *ApplicationsPrivate::remove(const QString &name, bool auto
     }
 
     const RequestPointer request = accept(m_removals, operation);
-    const auto takeRemoveError = [](const Request &failed, Transaction::Error error, const QString &details) {
+    const auto takeRemoveError = [](const Request &failed, const QString &error, const QString &details) {
         qWarning() << "Error uninstalling package"
-                   << ":" << error;
+                   << ":" << qPrintable(error);
         failed.operation->setError(details);
     };
     resolve(request, Transaction::FilterInstalled,
@@ -289,18 +311,19 @@ void ApplicationsPrivate::follow(const RequestPointer &request, Transaction *tra
                                  ErrorHandler onError, const std::function<void()> &next)
 {
     connect(transaction, &Transaction::errorCode, this,
-            [request, onError](Transaction::Error error, const QString &details) {
+            [request, onError](const Transaction::Error &error, const QString &details) {
                 if (request->operation)
-                    onError(*request, error, details);
+                    onError(*request, textOf(error), details);
             });
-    connect(transaction, &Transaction::finished, this, [this, request, transaction, next](Exit status) {
-        // A transaction ends once, whatever comes of it later.
-        transaction->disconnect(this);
-        if (status == Transaction::ExitSuccess && request->operation)
-            next();
-        else
-            fail(request);
-    });
+    connect(transaction, &Transaction::finished, this,
+            [request, transaction, next, this](const Transaction::Exit &status) {
+                // A transaction ends once, whatever comes of it later.
+                transaction->disconnect(this);
+                if (numberOf(status) == Transaction::ExitSuccess && request->operation)
+                    next();
+                else
+                    fail(request);
+            });
 }
 
 void ApplicationsPrivate::resolve(const RequestPointer &request, Transaction::Filters filter,
@@ -308,15 +331,15 @@ void ApplicationsPrivate::resolve(const RequestPointer &request, Transaction::Fi
 {
     Transaction *transaction = Daemon::resolve(request->name, filter);
     connect(transaction, &Transaction::package, this,
-            [request](Transaction::Info, const QString &packageId, const QString &) {
+            [request](const Transaction::Info &, const QString &packageId, const QString &) {
                 if (!request->operation)
                     return;
                 ApplicationOperationPrivate *operation = request->operation->d;
                 if (operation->version.isEmpty() || Daemon::packageVersion(packageId) == operation->version)
                     operation->packageId = packageId;
             });
-    const auto logError = [](const Request &, Transaction::Error error, const QString &details) {
-        qDebug() << "Error resolving package" << error << details;
+    const auto logError = [](const Request &, const QString &error, const QString &details) {
+        qDebug() << "Error resolving package" << qPrintable(error) << details;
     };
     follow(request, transaction, logError, [request, next] {
         const QString packageId = request->operation->d->packageId;

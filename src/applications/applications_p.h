@@ -73,9 +73,8 @@ private:
         const QPointer<ApplicationOperation> operation;
     };
     using RequestPointer = QSharedPointer<const Request>;
-    using Exit = PackageKit::Transaction::Exit;
-    using ErrorHandler
-        = void (*)(const Request &request, PackageKit::Transaction::Error error, const QString &details);
+    /** @p error is PackageKit's enumerator, for people. */
+    using ErrorHandler = void (*)(const Request &request, const QString &error, const QString &details);
 
     ApplicationOperation *refuse(ApplicationOperation *operation, const QString &reason) const;
     RequestPointer accept(Operations &pending, ApplicationOperation *operation);

@@ -729,6 +729,16 @@ void ApplicationsTest::errorsOfEachPhase()
     QCOMPARE(log.takeWarnings(), isLast ? QStringList(warning) : QStringList());
     tell(transaction, "Finished", {FailedExit, 0u});
     QCOMPARE(outcome.wait(), isLast ? failedWith("The cable is out") : Failed);
+
+    // A number that nobody knows yet.
+    Outcome unknown(request(&applications, install));
+    const QString next = transactionOf(member);
+    tell(next, "ErrorCode", {1000000u, QStringLiteral("Something new")});
+    QCOMPARE(log.takeWarnings().join(QString()).endsWith(
+                 QLatin1String(": PackageKit::Transaction::Error(1000000)")),
+             isLast);
+    tell(next, "Finished", {FailedExit, 0u});
+    QCOMPARE(unknown.wait(), isLast ? failedWith("Something new") : Failed);
 }
 
 void ApplicationsTest::transactionThatVanishes_data()
@@ -783,6 +793,7 @@ void ApplicationsTest::laterMatchReplacesAnEarlierOne()
     report("acme-agent;2.0-10;noarch;third");
     report("acme-agent");
     report("");
+    tell(transaction, "Package", {1000000u, QStringLiteral("acme-agent;3.0-1;noarch;fourth"), QString()});
     tell(transaction, "Finished", {SuccessfulExit, 0u});
     QCOMPARE(installed(), QStringLiteral("'acme-agent;2.0-1;noarch;second'"));
 }
