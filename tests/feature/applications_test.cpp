@@ -217,6 +217,8 @@ void ApplicationsTest::init()
 void ApplicationsTest::cleanup()
 {
     m_phone->clearFaults();
+    // What ended with its feature waits for an event loop.
+    QCoreApplication::sendPostedEvents(nullptr, QEvent::DeferredDelete);
 }
 
 void ApplicationsTest::listsPackages()
