@@ -79,7 +79,7 @@ public:
         : m_signals(operation)
         , m_operation(operation)
     {
-        QObject::connect(operation, &ApplicationOperation::finished,
+        QObject::connect(operation, &ApplicationOperation::finished, &m_signals,
                          [this](ApplicationOperation *finished) { m_error = finished->errorString(); });
     }
 
