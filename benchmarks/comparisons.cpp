@@ -38,6 +38,9 @@ constexpr Comparison Comparisons[] = {
     {"10,000 packages / the loop over librpm alone", "packages/library", "packages/librpm", 0},
     {"500 applications / rpm -qf of their files in one process", "applications/library", "applications/rpm",
      1},
+    {"1,000 notifications with nested actions / plain QtDBus demarshalling", "notifications/library/1000",
+     "notifications/QtDBus/1000", 0},
+    {"1,000 positions / hand-written QtDBus client", "positions/library/1000", "positions/QtDBus/1000", 0},
     {"loading the library / loading its dependencies", "load/library", "load/dependencies", 0},
 };
 

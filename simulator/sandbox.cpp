@@ -110,6 +110,11 @@ void writeLayer(const PhoneFiles &files)
         makeFolders(fs::path(layer + path).parent_path());
         writeFile(layer + path, content);
     }
+    for (const auto &[path, target] : files.links) {
+        makeFolders(fs::path(layer + path).parent_path());
+        if (symlink(target.c_str(), (layer + path).c_str()) < 0)
+            throw SetUpError::fromErrno("cannot create " + layer + path);
+    }
 }
 
 void mountOverlays()

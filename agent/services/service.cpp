@@ -17,6 +17,11 @@ Service Service::telephony()
     return {QStringLiteral("org.ofono"), QStringLiteral("telephony service")};
 }
 
+Service Service::connectionManager()
+{
+    return {QStringLiteral("net.connman"), QStringLiteral("connection manager")};
+}
+
 Service Service::mdmProxy()
 {
     return {QStringLiteral("org.corvaneos.mdmproxy"), QStringLiteral("MDM proxy")};
@@ -57,6 +62,11 @@ Reply Service::ensureRunning() const
 Reply Service::notRunning() const
 {
     return {Reply::ServiceLost, toString() + QLatin1String(" is not running")};
+}
+
+QString Service::refusal(const QString &reason) const
+{
+    return QStringLiteral("%1 refused: %2").arg(toString(), reason);
 }
 
 } // namespace Agent
