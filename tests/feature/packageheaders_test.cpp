@@ -1,0 +1,228 @@
+// SPDX-License-Identifier: LGPL-2.1-or-later
+#include "messagelog.h"
+
+#include <corvanemdm/applications.h>
+
+#include <QtCore/QFile>
+#include <QtTest/QtTest>
+
+#include <fcntl.h>
+#include <rpm/header.h>
+#include <rpm/rpmdb.h>
+#include <rpm/rpmlib.h>
+#include <rpm/rpmts.h>
+
+#include <functional>
+
+using Corvane::Mdm::ApplicationEntry;
+using Corvane::Mdm::Applications;
+using Corvane::Mdm::PackageEntry;
+
+namespace
+{
+
+const QString DatabaseFile = QStringLiteral("/var/lib/rpm/rpmdb.sqlite");
+
+/** Adds a header to the phone's database that no package manager would. */
+void addHeader(const std::function<void(Header)> &fill)
+{
+    const rpmts transactions = rpmtsCreate();
+    if (rpmtsOpenDB(transactions, O_RDWR) != 0)
+        qFatal("the package database cannot be opened (run the test inside corvane-simulator)");
+    const rpmtxn lock = rpmtxnBegin(transactions, RPMTXN_WRITE);
+    Header header = headerNew();
+    headerPutString(header, RPMTAG_RELEASE, "1");
+    headerPutString(header, RPMTAG_ARCH, "noarch");
+    headerPutString(header, RPMTAG_OS, "linux");
+    fill(header);
+    header = headerReload(header, RPMTAG_HEADERIMMUTABLE);
+    if (rpmtsImportHeader(lock, header, 0) != RPMRC_OK)
+        qFatal("the header cannot be added");
+    headerFree(header);
+    rpmtxnEnd(lock);
+    rpmtsFree(transactions);
+}
+
+QString textOf(const PackageEntry &package)
+{
+    return QStringList({package.name(), package.version(), package.vendor()}).join(QLatin1Char('|'));
+}
+
+} // namespace
+
+Q_DECLARE_METATYPE(std::function<void(Header)>)
+
+/** What the package database may hold that is not as it should be. */
+class PackageHeadersTest : public QObject
+{
+    Q_OBJECT
+
+private Q_SLOTS:
+    void initTestCase();
+    void headers_data();
+    void headers();
+    void headerWithoutANameIsPassedOver();
+    void ownerWithoutAVersion();
+    void severalOwnersOfOneFile();
+    void noDatabase();
+    void brokenDatabase();
+
+private:
+    int m_known = 0; ///< packages of the phone, and those that the tests added
+};
+
+void PackageHeadersTest::initTestCase()
+{
+    m_known = Applications().getInstalledPackages().size();
+    QVERIFY(m_known > 0);
+}
+
+void PackageHeadersTest::headers_data()
+{
+    using Fill = std::function<void(Header)>;
+    QTest::addColumn<Fill>("fill");
+    QTest::addColumn<QString>("package");
+    QTest::addColumn<bool>("valid");
+    QTest::addColumn<QStringList>("warnings");
+    const auto put = [](Header header, rpmTagVal tag, const char *text) {
+        headerPutString(header, tag, text);
+    };
+    const QStringList none;
+    QTest::newRow("all three") << Fill([put](Header header) {
+        put(header, RPMTAG_NAME, "whole");
+        put(header, RPMTAG_VERSION, "1.0");
+        put(header, RPMTAG_VENDOR, "Caf\303\251");
+    }) << QString::fromUtf8("whole|1.0|Caf\303\251")
+                               << true << none;
+    QTest::newRow("no vendor") << Fill([put](Header header) {
+        put(header, RPMTAG_NAME, "plain");
+        put(header, RPMTAG_VERSION, "1.0");
+    }) << "plain|1.0|" << true << none;
+    QTest::newRow("no version") << Fill([put](Header header) { put(header, RPMTAG_NAME, "unversioned"); })
+                                << "unversioned||" << false
+                                << QStringList(QStringLiteral("rpm headerGet failed for version"));
+    QTest::newRow("empty name") << Fill([put](Header header) {
+        put(header, RPMTAG_NAME, "");
+        put(header, RPMTAG_VERSION, "1.0");
+    }) << "|1.0|" << false << none;
+}
+
+void PackageHeadersTest::headers()
+{
+    QFETCH(std::function<void(Header)>, fill);
+    QFETCH(QString, package);
+    QFETCH(bool, valid);
+    QFETCH(QStringList, warnings);
+    MessageLog log;
+    const Applications applications;
+    applications.getInstalledPackages();
+    const QStringList before = log.takeWarnings();
+    addHeader(fill);
+    const QList<PackageEntry> packages = applications.getInstalledPackages();
+    QCOMPARE(packages.size(), ++m_known);
+    // The newest comes last.
+    QCOMPARE(textOf(packages.last()), package);
+    QCOMPARE(packages.last().isValid(), valid);
+    QCOMPARE(log.takeWarnings(), before + warnings);
+}
+
+void PackageHeadersTest::headerWithoutANameIsPassedOver()
+{
+    // For librpm such a header is damaged.
+    addHeader([](Header header) { headerPutString(header, RPMTAG_VERSION, "2.0"); });
+    QCOMPARE(Applications().getInstalledPackages().size(), m_known);
+}
+
+void PackageHeadersTest::ownerWithoutAVersion()
+{
+    const char *const entry = "/usr/share/applications/orphan.desktop";
+    QFile file{QString::fromLatin1(entry)};
+    QVERIFY(file.open(QIODevice::WriteOnly));
+    file.write("[Desktop Entry]\nType=Application\nName=Orphan\nExec=orphan\n");
+    file.close();
+    addHeader([](Header header) {
+        headerPutString(header, RPMTAG_NAME, "orphan");
+        const char *name = "orphan.desktop";
+        const char *folder = "/usr/share/applications/";
+        const uint32_t index = 0;
+        headerPutStringArray(header, RPMTAG_BASENAMES, &name, 1);
+        headerPutStringArray(header, RPMTAG_DIRNAMES, &folder, 1);
+        headerPutUint32(header, RPMTAG_DIRINDEXES, &index, 1);
+    });
+    ++m_known;
+    MessageLog log;
+    const QList<ApplicationEntry> entries = Applications().getInstalledApplications();
+    const auto orphan = std::find_if(entries.begin(), entries.end(), [](const ApplicationEntry &each) {
+        return each.name() == QLatin1String("Orphan");
+    });
+    QVERIFY(orphan != entries.end());
+    QCOMPARE(textOf(orphan->package()), QStringLiteral("orphan||"));
+    QVERIFY(!orphan->package().isValid());
+    QCOMPARE(log.takeWarnings(), QStringList(QStringLiteral("rpm headerGet failed for version")));
+    QVERIFY(file.remove());
+}
+
+void PackageHeadersTest::severalOwnersOfOneFile()
+{
+    const auto addOwner = [this](const char *package) {
+        addHeader([package](Header header) {
+            headerPutString(header, RPMTAG_NAME, package);
+            headerPutString(header, RPMTAG_VERSION, "1.0");
+            const char *name = "shared.desktop";
+            const char *folder = "/usr/share/applications/";
+            const uint32_t index = 0;
+            headerPutStringArray(header, RPMTAG_BASENAMES, &name, 1);
+            headerPutStringArray(header, RPMTAG_DIRNAMES, &folder, 1);
+            headerPutUint32(header, RPMTAG_DIRINDEXES, &index, 1);
+        });
+        ++m_known;
+    };
+    addOwner("first-owner");
+    addOwner("second-owner");
+    QFile file(QStringLiteral("/usr/share/applications/shared.desktop"));
+    QVERIFY(file.open(QIODevice::WriteOnly));
+    file.write("[Desktop Entry]\nType=Application\nName=Shared\nExec=shared\n");
+    file.close();
+    const QList<ApplicationEntry> entries = Applications().getInstalledApplications();
+    QVERIFY(file.remove());
+    QStringList owners;
+    for (const ApplicationEntry &entry : entries) {
+        if (entry.name() == QLatin1String("Shared"))
+            owners << entry.package().name();
+    }
+    QCOMPARE(owners, QStringList(QStringLiteral("first-owner")));
+}
+
+void PackageHeadersTest::noDatabase()
+{
+    const QString aside = DatabaseFile + QStringLiteral(".aside");
+    QVERIFY(QFile::rename(DatabaseFile, aside));
+    const Applications applications;
+    QCOMPARE(applications.getInstalledPackages().size(), 0);
+    const QList<ApplicationEntry> entries = applications.getInstalledApplications();
+    QVERIFY(!entries.isEmpty());
+    for (const ApplicationEntry &entry : entries)
+        QVERIFY(!entry.package().isValid());
+    QFile::remove(DatabaseFile);
+    QVERIFY(QFile::rename(aside, DatabaseFile));
+    QCOMPARE(applications.getInstalledPackages().size(), m_known);
+}
+
+void PackageHeadersTest::brokenDatabase()
+{
+    const QString aside = DatabaseFile + QStringLiteral(".aside");
+    QVERIFY(QFile::rename(DatabaseFile, aside));
+    QFile broken(DatabaseFile);
+    QVERIFY(broken.open(QIODevice::WriteOnly));
+    broken.write(QByteArray(100000, 'x'));
+    broken.close();
+    const Applications applications;
+    QCOMPARE(applications.getInstalledPackages().size(), 0);
+    QVERIFY(!applications.getInstalledApplications().isEmpty());
+    QVERIFY(broken.remove());
+    QVERIFY(QFile::rename(aside, DatabaseFile));
+    QCOMPARE(applications.getInstalledPackages().size(), m_known);
+}
+
+QTEST_GUILESS_MAIN(PackageHeadersTest)
+#include "packageheaders_test.moc"
