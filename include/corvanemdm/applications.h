@@ -108,12 +108,14 @@ public Q_SLOTS:
     void setFinishedWithError();
 
 Q_SIGNALS:
+    // Spelled as connections by name write them.
+
     /** The request has come to its end; the last signal, after failed() or succeeded(). */
-    void finished(ApplicationOperation *applicationOperation);
+    void finished(ApplicationOperation *applicationOperation); // clazy:exclude=fully-qualified-moc-types
     /** The request has failed; errorString() may tell why. */
-    void failed(ApplicationOperation *applicationOperation);
+    void failed(ApplicationOperation *applicationOperation); // clazy:exclude=fully-qualified-moc-types
     /** The request has succeeded. */
-    void succeeded(ApplicationOperation *applicationOperation);
+    void succeeded(ApplicationOperation *applicationOperation); // clazy:exclude=fully-qualified-moc-types
 
 private:
     Q_DISABLE_COPY(ApplicationOperation)

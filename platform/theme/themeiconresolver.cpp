@@ -176,7 +176,8 @@ private:
 
     QString findInTheme(const QString &theme, const QString &name, int size)
     {
-        for (const QString &folder : foldersBySize(theme, size)) {
+        const QStringList folders = foldersBySize(theme, size);
+        for (const QString &folder : folders) {
             const QString file
                 = findInFolders(m_iconFolders, QLatin1Char('/') + theme + QLatin1Char('/') + folder, name);
             if (!file.isEmpty())

@@ -158,7 +158,8 @@ void PackageKit::attach(Service &service)
                            [this](MethodCall &call) {
                                GVariantBuilder list;
                                g_variant_builder_init(&list, G_VARIANT_TYPE_OBJECT_PATH_ARRAY);
-                               for (const QString &path : unfinished())
+                               const QStringList paths = unfinished();
+                               for (const QString &path : paths)
                                    g_variant_builder_add(&list, "o", path.toUtf8().constData());
                                call.reply(g_variant_new("(ao)", &list));
                            }},
@@ -384,7 +385,8 @@ void PackageKit::tellList() const
 {
     GVariantBuilder list;
     g_variant_builder_init(&list, G_VARIANT_TYPE_STRING_ARRAY);
-    for (const QString &path : unfinished())
+    const QStringList paths = unfinished();
+    for (const QString &path : paths)
         g_variant_builder_add(&list, "s", path.toUtf8().constData());
     m_service->emitSignal(objectPath, interfaceName, QStringLiteral("TransactionListChanged"),
                           g_variant_new("(as)", &list));
