@@ -5,6 +5,8 @@
 #include "command.h"
 #include "timeouts.h"
 
+#include <QtCore/QJsonObject>
+
 namespace Corvane
 {
 namespace Agent
@@ -20,6 +22,12 @@ Command accountCommand();
 Command certificatesCommand();
 Command autostartCommand();
 Command simCommand();
+Command packagesCommand();
+Command applicationsCommand();
+Command installCommand();
+Command removeCommand();
+Command wifiCommand();
+Command flightModeCommand();
 Command policyCommand();
 
 // Options that commands share.
@@ -27,6 +35,9 @@ Option jsonOption();
 Option timeoutOption(const QString &meaning);
 
 bool wantsJson(const Values &values);
+
+/** Prints what was asked for in the form that was asked for. */
+void printResult(const Values &values, const QString &text, const QJsonObject &json);
 
 /** The timeouts that hold unless the command line says otherwise. */
 Timeouts timeoutsOf(const Values &values);

@@ -4,6 +4,9 @@
 #include "accountsection.h"
 #include "autostartsection.h"
 #include "certificatesection.h"
+#include "packagesection.h"
+#include "proxysection.h"
+#include "radiosection.h"
 #include "rulesection.h"
 #include "softwareupdatesection.h"
 
@@ -20,6 +23,10 @@ PolicySections makePolicySections(const Timeouts &timeouts)
     sections.push_back(std::make_unique<AccountSection>());
     sections.push_back(std::make_unique<CertificateSection>(timeouts.confirmation));
     sections.push_back(std::make_unique<AutostartSection>());
+    sections.push_back(std::make_unique<PackageSection>(timeouts.silence));
+    sections.push_back(std::make_unique<ProxySection>(timeouts.confirmation));
+    for (const Radio radio : {Radio::FlightMode, Radio::WiFi})
+        sections.push_back(std::make_unique<RadioSection>(radio, timeouts.confirmation));
     sections.push_back(std::make_unique<SoftwareUpdateSection>(timeouts.silence));
     return sections;
 }

@@ -40,11 +40,11 @@ Reply replyOf(const Provisioner &provisioner)
     if (error == 0)
         return {};
     const Service proxy = Service::mdmProxy();
-    const QString refused
-        = QStringLiteral("%1 refused: %2").arg(proxy.toString(), provisioner.errorMessage());
     if (error != 1)
-        return {Reply::Refused, QStringLiteral("%1 (code %2)").arg(refused).arg(error)};
-    return proxy.isRunning() ? Reply{Reply::Refused, refused} : proxy.notRunning();
+        return {Reply::Refused,
+                proxy.refusal(QStringLiteral("%1 (code %2)").arg(provisioner.errorMessage()).arg(error))};
+    return proxy.isRunning() ? Reply{Reply::Refused, proxy.refusal(provisioner.errorMessage())}
+                             : proxy.notRunning();
 }
 
 void describeIncoming(EmailAccountProvisioner &email, const QJsonObject &server)

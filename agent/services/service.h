@@ -17,9 +17,11 @@ struct Service {
     QString description; ///< for people
 
     static Service telephony();
+    static Service connectionManager();
     static Service mdmProxy();
     /** A program rather than a service of the bus: it has no name there, and is always at hand. */
     static Service certificateHelper();
+    static Service packageKit();
 
     /** "the telephony service (org.ofono)" */
     QString toString() const;
@@ -35,6 +37,9 @@ struct Service {
 
     /** The answer to everything that is asked of a service that is not there. */
     Reply notRunning() const;
+
+    /** "the telephony service (org.ofono) refused: @p reason" */
+    QString refusal(const QString &reason) const;
 };
 
 } // namespace Agent

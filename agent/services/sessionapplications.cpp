@@ -50,7 +50,7 @@ Reply SessionApplications::replyOf(Autostart::Result result, const QString &desk
         reason = QStringLiteral("it does not accept the desktop entry \"%1\"").arg(desktopFile);
     else if (result != Autostart::InternalError)
         reason = QStringLiteral("code %1").arg(result);
-    return {Reply::Refused, QStringLiteral("%1 refused: %2").arg(proxy.toString(), reason)};
+    return {Reply::Refused, proxy.refusal(reason)};
 }
 
 } // namespace Agent

@@ -86,7 +86,7 @@ Reply TrustStore::perform(Finished finished, const std::function<void()> &reques
     connect(&m_certificates, finished, &wait,
             [this, &wait, &helper](const CertificateFile &, Certificates::Result result) {
                 wait.end(result == Certificates::Success ? Reply::Done : Reply::Refused,
-                         QStringLiteral("%1 refused: %2").arg(helper.toString(), m_refusal));
+                         helper.refusal(m_refusal));
             });
     request();
     return wait.run();

@@ -13,7 +13,8 @@ namespace Agent
 namespace
 {
 
-const QLatin1String refusals(R"(^Method call failed: |GetAll\(\) failed: |^search\(\) failed: )");
+const QLatin1String refusals(
+    R"(^Method call failed: |GetAll\(\) failed: |^search\(\) failed: |^The connection manager refused )");
 
 QString seconds(std::chrono::milliseconds time)
 {
@@ -24,9 +25,7 @@ QString seconds(std::chrono::milliseconds time)
 
 Wait::Wait(const Service &service, std::chrono::milliseconds time, const QString &awaited)
     : m_service(service)
-    , m_refusals(refusals, [this](const QString &reason) {
-        end(Reply::Refused, QStringLiteral("%1 refused: %2").arg(m_service.toString(), reason));
-    })
+    , m_refusals(refusals, [this](const QString &reason) { end(Reply::Refused, m_service.refusal(reason)); })
 {
     if (!service.name.isEmpty()) {
         m_watcher.setConnection(QDBusConnection::systemBus());
