@@ -6,9 +6,6 @@
 #include <QtCore/QVariantList>
 #include <QtCore/QVariantMap>
 #include <QtDBus/QDBusMetaType>
-#include <QtDBus/QDBusObjectPath>
-#include <QtDBus/QDBusSignature>
-#include <QtDBus/QDBusUnixFileDescriptor>
 #include <QtDBus/QDBusVariant>
 
 #include <algorithm>
@@ -36,13 +33,6 @@ inline bool isMarshallable(const QVariant &value)
         return all(value.toHash());
     if (value.userType() == qMetaTypeId<QDBusVariant>())
         return isMarshallable(value.value<QDBusVariant>().variant());
-    // Types that have values which stand for nothing.
-    if (value.userType() == qMetaTypeId<QDBusObjectPath>())
-        return !value.value<QDBusObjectPath>().path().isEmpty();
-    if (value.userType() == qMetaTypeId<QDBusSignature>())
-        return !value.value<QDBusSignature>().signature().isEmpty();
-    if (value.userType() == qMetaTypeId<QDBusUnixFileDescriptor>())
-        return value.value<QDBusUnixFileDescriptor>().isValid();
     return value.isValid() && QDBusMetaType::typeToSignature(value.userType());
 }
 
