@@ -53,7 +53,7 @@ QString nameOf(const std::function<QStringList(QSslCertificate::SubjectInfo)> &i
 TrustStore::TrustStore(std::chrono::milliseconds timeout, QObject *parent)
     : QObject(parent)
     , m_timeout(timeout)
-    , m_warnings(QStringLiteral("^(Installing certificate failed:|Unable to execute mdm-certificate)"),
+    , m_warnings(QStringLiteral("^(?:Installing certificate failed:|Unable to execute mdm-certificate)"),
                  [this](const QString &warning) { m_refusal = refusalIn(warning); })
 {
     connect(&m_certificates, &Certificates::installedFilesChanged, this, &TrustStore::changed);
