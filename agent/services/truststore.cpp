@@ -84,9 +84,9 @@ Reply TrustStore::perform(Finished finished, const std::function<void()> &reques
     const Service helper = Service::certificateHelper();
     Wait wait(helper, m_timeout, QStringLiteral("finish"));
     connect(&m_certificates, finished, &wait,
-            [this, &wait, &helper](const CertificateFile &, Certificates::Result result) {
-                wait.end(result == Certificates::Success ? Reply::Done : Reply::Refused,
-                         helper.refusal(m_refusal));
+            [this, waiting = &wait, helper](const CertificateFile &, Certificates::Result result) {
+                waiting->end(result == Certificates::Success ? Reply::Done : Reply::Refused,
+                             helper.refusal(m_refusal));
             });
     request();
     return wait.run();

@@ -123,13 +123,17 @@ public:
 
 Q_SIGNALS:
     /** A request of install() has come to its end. */
-    void installFinished(const CertificateFile &file, Certificates::Result result);
+    void installFinished(const Corvane::Mdm::CertificateFile &file,
+                         Corvane::Mdm::Certificates::Result result);
     /** A request of uninstall() has come to its end. */
-    void uninstallFinished(const CertificateFile &file, Certificates::Result result);
+    void uninstallFinished(const Corvane::Mdm::CertificateFile &file,
+                           Corvane::Mdm::Certificates::Result result);
     /** A request of blacklist() has come to its end. */
-    void blacklistFinished(const CertificateFile &file, Certificates::Result result);
+    void blacklistFinished(const Corvane::Mdm::CertificateFile &file,
+                           Corvane::Mdm::Certificates::Result result);
     /** A request of unblacklist() has come to its end. */
-    void unblacklistFinished(const CertificateFile &file, Certificates::Result result);
+    void unblacklistFinished(const Corvane::Mdm::CertificateFile &file,
+                             Corvane::Mdm::Certificates::Result result);
     /** What certificates() tells may have changed. */
     void certificatesChanged();
     /** installedFiles(), or what is in one of them, may have changed. */

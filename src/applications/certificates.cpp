@@ -28,9 +28,6 @@ void registerTypes()
 {
     qRegisterMetaType<CertificateFile>("Corvane::Mdm::CertificateFile");
     qRegisterMetaType<Certificates::Result>("Corvane::Mdm::Certificates::Result");
-    // The signals are declared with the short spellings; connections by name and queued ones look them up.
-    qRegisterMetaType<CertificateFile>("CertificateFile");
-    qRegisterMetaType<Certificates::Result>("Certificates::Result");
 }
 
 QByteArray pemOf(const QList<QSslCertificate> &certificates)

@@ -862,7 +862,9 @@ void CertificatesTest::worksThroughTheMetaObject()
 {
     replaceHelper("exit 0");
     Certificates certificates;
-    const QSignalSpy spy(&certificates, SIGNAL(uninstallFinished(CertificateFile, Certificates::Result)));
+    const QSignalSpy spy(
+        &certificates,
+        SIGNAL(uninstallFinished(Corvane::Mdm::CertificateFile, Corvane::Mdm::Certificates::Result)));
     QVERIFY(spy.isValid());
     CertificateFile queued;
     connect(
