@@ -112,47 +112,77 @@ public:
     explicit EmailAccountProvisioner(QObject *parent = nullptr);
     ~EmailAccountProvisioner() override;
 
+    /** See Provisioner::createAccount(). */
     bool createAccount() override;
 
-    /** @name Settings
-     * See the properties of these names.
-     * @{
-     */
+    /** See the property of that name. */
     QString defaultServiceName() const;
+    /** Sets the property defaultServiceName. */
     void setDefaultServiceName(const QString &name);
+    /** See the property of that name. */
     QString emailAddress() const;
+    /** Sets the property emailAddress. */
     void setEmailAddress(const QString &address);
+    /** See the property of that name. */
     IncomingProtocol incomingProtocol() const;
+    /** Sets the property incomingProtocol. */
     void setIncomingProtocol(IncomingProtocol protocol);
+    /** See the property of that name. */
     QString incomingUsername() const;
+    /** Sets the property incomingUsername. */
     void setIncomingUsername(const QString &name);
+    /** See the property of that name. */
     QString incomingPassword() const;
+    /** Sets the property incomingPassword. */
     void setIncomingPassword(const QString &password);
+    /** See the property of that name. */
     QString incomingServer() const;
+    /** Sets the property incomingServer. */
     void setIncomingServer(const QString &server);
+    /** See the property of that name. */
     int incomingPort() const;
+    /** Sets the property incomingPort. */
     void setIncomingPort(int port);
+    /** See the property of that name. */
     ConnectionEncryption incomingConnectionEncryption() const;
+    /** Sets the property incomingConnectionEncryption. */
     void setIncomingConnectionEncryption(ConnectionEncryption encryption);
+    /** See the property of that name. */
     bool incomingAcceptUntrustedCertificates() const;
+    /** Sets the property incomingAcceptUntrustedCertificates. */
     void setIncomingAcceptUntrustedCertificates(bool accept);
+    /** See the property of that name. */
     OutgoingProtocol outgoingProtocol() const;
+    /** Sets the property outgoingProtocol. */
     void setOutgoingProtocol(OutgoingProtocol protocol);
+    /** See the property of that name. */
     QString outgoingUsername() const;
+    /** Sets the property outgoingUsername. */
     void setOutgoingUsername(const QString &name);
+    /** See the property of that name. */
     QString outgoingPassword() const;
+    /** Sets the property outgoingPassword. */
     void setOutgoingPassword(const QString &password);
+    /** See the property of that name. */
     QString outgoingServer() const;
+    /** Sets the property outgoingServer. */
     void setOutgoingServer(const QString &server);
+    /** See the property of that name. */
     int outgoingPort() const;
+    /** Sets the property outgoingPort. */
     void setOutgoingPort(int port);
+    /** See the property of that name. */
     ConnectionEncryption outgoingConnectionEncryption() const;
+    /** Sets the property outgoingConnectionEncryption. */
     void setOutgoingConnectionEncryption(ConnectionEncryption encryption);
+    /** See the property of that name. */
     bool outgoingAcceptUntrustedCertificates() const;
+    /** Sets the property outgoingAcceptUntrustedCertificates. */
     void setOutgoingAcceptUntrustedCertificates(bool accept);
+    /** See the property of that name. */
     Authentication outgoingAuthentication() const;
+    /** Sets the property outgoingAuthentication. */
     void setOutgoingAuthentication(Authentication authentication);
-    /** @} */
 
 Q_SIGNALS:
     /** The property defaultServiceName has changed. */

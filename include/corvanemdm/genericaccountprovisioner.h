@@ -34,19 +34,21 @@ public:
     explicit GenericAccountProvisioner(QObject *parent = nullptr);
     ~GenericAccountProvisioner() override;
 
+    /** See Provisioner::createAccount(). */
     bool createAccount() override;
 
-    /** @name Settings
-     * See the properties of these names.
-     * @{
-     */
+    /** See the property of that name. */
     QString defaultServiceName() const;
+    /** Sets the property defaultServiceName. */
     void setDefaultServiceName(const QString &name);
+    /** See the property of that name. */
     QString username() const;
+    /** Sets the property username. */
     void setUsername(const QString &name);
+    /** See the property of that name. */
     QString password() const;
+    /** Sets the property password. */
     void setPassword(const QString &password);
-    /** @} */
 
 Q_SIGNALS:
     /** The property defaultServiceName has changed. */

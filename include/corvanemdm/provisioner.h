@@ -84,28 +84,30 @@ public:
      */
     virtual QList<AccountInfo> listAccounts();
 
-    /** @name What became of the last call
-     * 0 and empty: all went well. 1: the proxy could not be asked, or a required setting is missing.
-     * Otherwise the proxy's own code and text.
-     * @{
+    /**
+     * What became of the last call: 0 when all went well, 1 when the proxy could not be asked or a required
+     * setting is missing, otherwise the proxy's own code.
      */
     int error() const;
+    /** What went wrong with the last call, in the proxy's or D-Bus's words; empty when all went well. */
     QString errorMessage() const;
-    /** @} */
 
-    /** @name Settings
-     * See the properties of these names.
-     * @{
-     */
+    /** See the property of that name. */
     QString providerName() const;
+    /** Sets the property providerName. */
     void setProviderName(const QString &name);
+    /** See the property of that name. */
     QString accountDisplayName() const;
+    /** Sets the property accountDisplayName. */
     void setAccountDisplayName(const QString &name);
+    /** See the property of that name. */
     QVariantMap accountConfiguration() const;
+    /** Sets the property accountConfiguration. */
     void setAccountConfiguration(const QVariantMap &configuration);
+    /** See the property of that name. */
     bool accountReadOnly() const;
+    /** Sets the property accountReadOnly. */
     void setAccountReadOnly(bool readOnly);
-    /** @} */
 
 Q_SIGNALS:
     /** The property canCreateAccount has changed; after the signal of the setting that did it. */
