@@ -42,6 +42,27 @@ guint32 MethodCall::number(gsize index) const
     return g_variant_get_uint32(Variant(g_variant_get_child_value(arguments(), index)).get());
 }
 
+guint64 MethodCall::bits(gsize index) const
+{
+    return g_variant_get_uint64(Variant(g_variant_get_child_value(arguments(), index)).get());
+}
+
+bool MethodCall::flag(gsize index) const
+{
+    return g_variant_get_boolean(Variant(g_variant_get_child_value(arguments(), index)).get());
+}
+
+QStringList MethodCall::texts(gsize index) const
+{
+    const Variant list(g_variant_get_child_value(arguments(), index));
+    QStringList values;
+    for (gsize i = 0; i < g_variant_n_children(list.get()); ++i) {
+        const Variant value(g_variant_get_child_value(list.get(), i));
+        values << QString::fromUtf8(g_variant_get_string(value.get(), nullptr));
+    }
+    return values;
+}
+
 void MethodCall::reply(GVariant *values)
 {
     g_dbus_method_invocation_return_value(m_invocation, values);
@@ -63,7 +84,8 @@ ExportedObjects::~ExportedObjects()
         g_dbus_connection_unregister_object(m_connection, object->registration);
 }
 
-void ExportedObjects::add(const QString &path, const QString &interface, MethodHandlers handlers)
+void ExportedObjects::add(const QString &path, const QString &interface, MethodHandlers handlers,
+                          PropertyReaders properties)
 {
     static const GDBusInterfaceVTable vtable = {
         [](GDBusConnection *, const gchar *, const gchar *, const gchar *, const gchar *member, GVariant *,
@@ -76,7 +98,10 @@ void ExportedObjects::add(const QString &path, const QString &interface, MethodH
                 call.fail(error);
             }
         },
-        nullptr,
+        [](GDBusConnection *, const gchar *, const gchar *, const gchar *, const gchar *name, GError **,
+           gpointer data) {
+            return static_cast<const Object *>(data)->properties.at(QString::fromUtf8(name))();
+        },
         nullptr,
         {},
     };
@@ -88,10 +113,16 @@ void ExportedObjects::add(const QString &path, const QString &interface, MethodH
                    (*method)->name);
     }
 
+    for (GDBusPropertyInfo **property = contract->properties; property && *property; ++property) {
+        if (!properties.count(QString::fromUtf8((*property)->name)))
+            qFatal("%s at %s has no %s", qUtf8Printable(interface), qUtf8Printable(path), (*property)->name);
+    }
+
     auto object = std::make_unique<Object>();
     object->path = path;
     object->interface = interface;
     object->handlers = std::move(handlers);
+    object->properties = std::move(properties);
     ErrorSlot error;
     object->registration = g_dbus_connection_register_object(
         m_connection, path.toUtf8().constData(), contract, &vtable, object.get(), nullptr, &error);
@@ -234,9 +265,10 @@ void BusConnection::watchSignal(const QString &service, const QString &member,
         this, nullptr);
 }
 
-void BusConnection::addObject(const QString &path, const QString &interface, MethodHandlers handlers)
+void BusConnection::addObject(const QString &path, const QString &interface, MethodHandlers handlers,
+                              PropertyReaders properties)
 {
-    m_objects->add(path, interface, std::move(handlers));
+    m_objects->add(path, interface, std::move(handlers), std::move(properties));
 }
 
 void BusConnection::removeObject(const QString &path, const QString &interface)

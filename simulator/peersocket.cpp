@@ -52,7 +52,7 @@ void PeerSocket::take(GDBusConnection *connection)
     Peer peer{GObjectPointer<GDBusConnection>(G_DBUS_CONNECTION(g_object_ref(connection))),
               std::make_unique<ExportedObjects>(connection)};
     for (const Offer &offer : m_offers)
-        peer.objects->add(offer.path, offer.interface, offer.handlers);
+        peer.objects->add(offer.path, offer.interface, offer.handlers, offer.properties);
     g_signal_connect(connection, "closed",
                      G_CALLBACK(+[](GDBusConnection *closed, gboolean, GError *, gpointer data) {
                          static_cast<PeerSocket *>(data)->drop(closed);
@@ -66,11 +66,12 @@ void PeerSocket::drop(GDBusConnection *connection)
     m_peers.remove_if([connection](const Peer &peer) { return peer.connection.get() == connection; });
 }
 
-void PeerSocket::addObject(const QString &path, const QString &interface, const MethodHandlers &handlers)
+void PeerSocket::addObject(const QString &path, const QString &interface, const MethodHandlers &handlers,
+                           const PropertyReaders &properties)
 {
-    m_offers.push_back({path, interface, handlers});
+    m_offers.push_back({path, interface, handlers, properties});
     for (const Peer &peer : m_peers)
-        peer.objects->add(path, interface, handlers);
+        peer.objects->add(path, interface, handlers, properties);
 }
 
 void PeerSocket::removeObject(const QString &path, const QString &interface)

@@ -28,7 +28,8 @@ public:
     PeerSocket &operator=(const PeerSocket &) = delete;
 
     /** For the connections of the present and of the future; as those of ExportedObjects. */
-    void addObject(const QString &path, const QString &interface, const MethodHandlers &handlers);
+    void addObject(const QString &path, const QString &interface, const MethodHandlers &handlers,
+                   const PropertyReaders &properties);
     void removeObject(const QString &path, const QString &interface);
     /** To every client; @p arguments is a tuple, or null for none. */
     void emitSignal(const QString &path, const QString &interface, const QString &member,
@@ -43,6 +44,7 @@ private:
         QString path;
         QString interface;
         MethodHandlers handlers;
+        PropertyReaders properties;
     };
 
     void take(GDBusConnection *connection);

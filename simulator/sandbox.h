@@ -32,6 +32,8 @@ struct PhoneFiles {
     /** Folders below /etc, /usr or /var that everything in the phone may write to; those below /sys/class are
      * only there. */
     std::vector<std::string> writableFolders;
+    /** Folders below /etc, /usr or /var in which the phone has its own files and none of the machine's. */
+    std::vector<std::string> ownFolders;
 };
 
 /**

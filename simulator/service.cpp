@@ -64,12 +64,13 @@ void Service::listenAt(const QString &path)
     });
 }
 
-void Service::addObject(const QString &path, const QString &interface, MethodHandlers handlers)
+void Service::addObject(const QString &path, const QString &interface, MethodHandlers handlers,
+                        PropertyReaders properties)
 {
     if (m_socket)
-        m_socket->addObject(path, interface, handlers);
+        m_socket->addObject(path, interface, handlers, properties);
     else
-        m_connection->addObject(path, interface, std::move(handlers));
+        m_connection->addObject(path, interface, std::move(handlers), std::move(properties));
 }
 
 void Service::removeObject(const QString &path, const QString &interface)

@@ -17,14 +17,14 @@ Service Service::telephony()
     return {QStringLiteral("org.ofono"), QStringLiteral("telephony service")};
 }
 
-Service Service::mdmProxy()
-{
-    return {QStringLiteral("org.corvaneos.mdmproxy"), QStringLiteral("MDM proxy")};
-}
-
 Service Service::connectionManager()
 {
     return {QStringLiteral("net.connman"), QStringLiteral("connection manager")};
+}
+
+Service Service::mdmProxy()
+{
+    return {QStringLiteral("org.corvaneos.mdmproxy"), QStringLiteral("MDM proxy")};
 }
 
 Service Service::packageKit()

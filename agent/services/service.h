@@ -17,12 +17,12 @@ struct Service {
     QString description; ///< for people
 
     static Service telephony();
+    static Service connectionManager();
     static Service mdmProxy();
-    static Service packageKit();
     static Service deviceLock();
     /** The bus itself, which answers for services that come and go. */
     static Service bus();
-    static Service connectionManager();
+    static Service packageKit();
 
     /** "the telephony service (org.ofono)" */
     QString toString() const;
