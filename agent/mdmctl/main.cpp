@@ -37,7 +37,7 @@ Command program()
     mdmctl.commands = {updateCommand(),   callsCommand(),        smsCommand(),        dataCommand(),
                        simCommand(),      wifiCommand(),         flightModeCommand(), callStatisticsCommand(),
                        packagesCommand(), applicationsCommand(), installCommand(),    removeCommand(),
-                       lockCommand(), securityCommand(), infoCommand(), policyCommand()};
+                       lockCommand(),     securityCommand(),     infoCommand(),       policyCommand()};
     mdmctl.commands.append(completionCommand(mdmctl));
     return mdmctl;
 }

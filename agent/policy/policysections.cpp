@@ -1,10 +1,10 @@
 // SPDX-License-Identifier: LGPL-2.1-or-later
 #include "policysections.h"
 
+#include "devicelocksection.h"
 #include "packagesection.h"
 #include "proxysection.h"
 #include "radiosection.h"
-#include "devicelocksection.h"
 #include "rulesection.h"
 #include "securitysection.h"
 #include "softwareupdatesection.h"
