@@ -5,12 +5,17 @@
 #include "service.h"
 #include "simcards.h"
 #include "table.h"
+#include "wait.h"
 #include "warningcapture.h"
 
 #include <corvanemdm/applications.h>
+#include <corvanemdm/batteryinfo.h>
 #include <corvanemdm/sysinfo.h>
 
 #include <QtCore/QJsonArray>
+
+#include <algorithm>
+#include <chrono>
 
 namespace Corvane
 {
@@ -154,6 +159,26 @@ void addLock(Inventory &inventory, const Timeouts &timeouts)
     inventory.addMember(QStringLiteral("homeEncrypted"), isEncrypted);
 }
 
+void addBattery(Inventory &inventory, const Timeouts &timeouts)
+{
+    const QString title = QStringLiteral("battery");
+    // A phone without a battery never tells of one.
+    constexpr std::chrono::milliseconds longest(2000);
+    const Service power{QStringLiteral("org.freedesktop.UPower"), QStringLiteral("power service")};
+    Reply reply = power.ensureRunning();
+    Mdm::BatteryInfo battery;
+    if (reply.isDone()) {
+        Wait wait(power, std::min(timeouts.confirmation, longest), QStringLiteral("tell of a battery"));
+        wait.until(&battery, &BatteryStatus::chargePercentageChanged,
+                   [&battery] { return battery.chargePercentage() >= 0; });
+        reply = wait.run();
+    }
+    if (!reply.isDone())
+        return inventory.addMissing(title, title, power, reply);
+    inventory.add(title, QStringLiteral("%1%").arg(battery.chargePercentage()));
+    inventory.addMember(title, battery.chargePercentage());
+}
+
 void addPackages(Inventory &inventory)
 {
     const int count = Mdm::Applications().getInstalledPackages().size();
@@ -169,6 +194,7 @@ int runInfo(const Values &values)
     addSims(inventory, timeouts);
     addAddresses(inventory);
     addLock(inventory, timeouts);
+    addBattery(inventory, timeouts);
     addPackages(inventory);
     printResult(values, inventory.toString(), inventory.toJson());
     return ExitDone;
