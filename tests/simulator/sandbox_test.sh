@@ -137,7 +137,7 @@ phone_is_its_own() {
     expect "loopback" "$(phone sh -c 'echo $(($(cat /sys/class/net/lo/flags) & 1))')" 1
     expect "first process" "$(phone cat /proc/1/comm)" corvane-simulat
     expect "devices" "$(phone sh -c 'cd /dev; echo *')" \
-        "fd full null ptmx pts random shm stderr stdin stdout tty urandom zero"
+        "fd full gnss0 null ptmx pts random shm stderr stdin stdout tty urandom zero"
     expect "/run" "$(phone sh -c 'cd /run; echo *')" "corvane-simulator dbus lock systemd user"
     expect "folders of sessions" "$(phone sh -c 'cd /run/systemd; echo *')" "machines seats sessions users"
     expect "settings of the kernel" "$(phone sh -c 'cat /proc/sys/kernel/hostname; echo x 2>&1 >/proc/sys/kernel/hostname' \
