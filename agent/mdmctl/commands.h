@@ -25,6 +25,8 @@ Command flightModeCommand();
 Command cellularCommand();
 Command apnCommand();
 Command notifyCommand();
+Command locationCommand();
+Command timeCommand();
 Command policyCommand();
 
 // Options that commands share.

@@ -33,10 +33,11 @@ Command program()
                                         "  1  refused or failed\n"
                                         "  2  wrong usage: nothing was sent\n"
                                         "  3  the service that it takes is not available");
-    mdmctl.commands
-        = {updateCommand(),         callsCommand(),      smsCommand(),      dataCommand(), simCommand(),
-           wifiCommand(),           flightModeCommand(), cellularCommand(), apnCommand(),  notifyCommand(),
-           callStatisticsCommand(), policyCommand()};
+    mdmctl.commands = {updateCommand(),         callsCommand(),    smsCommand(),
+                       dataCommand(),           simCommand(),      wifiCommand(),
+                       flightModeCommand(),     cellularCommand(), apnCommand(),
+                       notifyCommand(),         locationCommand(), timeCommand(),
+                       callStatisticsCommand(), policyCommand()};
     mdmctl.commands.append(completionCommand(mdmctl));
     return mdmctl;
 }

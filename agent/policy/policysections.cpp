@@ -2,6 +2,7 @@
 #include "policysections.h"
 
 #include "cellularsection.h"
+#include "devicesettingssection.h"
 #include "radiosection.h"
 #include "rulesection.h"
 #include "softwareupdatesection.h"
@@ -19,6 +20,10 @@ PolicySections makePolicySections(const Timeouts &timeouts)
     for (const Radio radio : {Radio::FlightMode, Radio::WiFi})
         sections.push_back(std::make_unique<RadioSection>(radio, timeouts.confirmation));
     sections.push_back(std::make_unique<CellularSection>(timeouts));
+    sections.push_back(
+        std::make_unique<DeviceSettingsSection>(QStringLiteral("location"), makeLocationSettings, timeouts));
+    sections.push_back(
+        std::make_unique<DeviceSettingsSection>(QStringLiteral("time"), makeClockSettings, timeouts));
     sections.push_back(std::make_unique<SoftwareUpdateSection>(timeouts.silence));
     return sections;
 }

@@ -27,6 +27,16 @@ Service Service::connectionManager()
     return {QStringLiteral("net.connman"), QStringLiteral("connection manager")};
 }
 
+Service Service::bus()
+{
+    return {QStringLiteral("org.freedesktop.DBus"), QStringLiteral("system bus")};
+}
+
+Service Service::clock()
+{
+    return {QStringLiteral("org.freedesktop.timedate1"), QStringLiteral("time service")};
+}
+
 QString Service::toString() const
 {
     return QStringLiteral("the %1 (%2)").arg(description, name);

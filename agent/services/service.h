@@ -18,7 +18,10 @@ struct Service {
 
     static Service telephony();
     static Service mdmProxy();
+    /** The bus itself, which answers for services that come and go. */
+    static Service bus();
     static Service connectionManager();
+    static Service clock();
 
     /** "the telephony service (org.ofono)" */
     QString toString() const;
