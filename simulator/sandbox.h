@@ -27,8 +27,12 @@ public:
 struct PhoneFiles {
     /** Contents by absolute path, below /etc, /usr or /var. */
     std::map<std::string, std::string> files;
+    /** Where symbolic links lead to, by absolute path below /etc, /usr or /var. They hide what is there. */
+    std::map<std::string, std::string> links;
     /** Folders below /etc, /usr or /var that everything in the phone may write to. */
     std::vector<std::string> writableFolders;
+    /** Folders below /etc, /usr or /var in which the phone has its own files and none of the machine's. */
+    std::vector<std::string> ownFolders;
 };
 
 /**

@@ -22,6 +22,7 @@ Command program()
     mdmctl.description = QStringLiteral("Examples:\n"
                                         "  mdmctl update status\n"
                                         "  mdmctl calls add dial 244051234567890 block\n"
+                                        "  mdmctl install acme-mail\n"
                                         "  mdmctl flight-mode on\n"
                                         "  mdmctl policy check company-phone.json\n"
                                         "\n"
@@ -37,7 +38,8 @@ Command program()
                        dataCommand(),           simCommand(),      wifiCommand(),
                        flightModeCommand(),     cellularCommand(), apnCommand(),
                        notifyCommand(),         locationCommand(), timeCommand(),
-                       callStatisticsCommand(), policyCommand()};
+                       callStatisticsCommand(), packagesCommand(), applicationsCommand(),
+                       installCommand(),        removeCommand(),   policyCommand()};
     mdmctl.commands.append(completionCommand(mdmctl));
     return mdmctl;
 }

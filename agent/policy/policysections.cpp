@@ -3,6 +3,8 @@
 
 #include "cellularsection.h"
 #include "devicesettingssection.h"
+#include "packagesection.h"
+#include "proxysection.h"
 #include "radiosection.h"
 #include "rulesection.h"
 #include "softwareupdatesection.h"
@@ -17,6 +19,8 @@ PolicySections makePolicySections(const Timeouts &timeouts)
     PolicySections sections;
     for (const RuleFamily &family : {RuleFamily::calls(), RuleFamily::sms(), RuleFamily::data()})
         sections.push_back(std::make_unique<RuleSection>(family, timeouts.confirmation));
+    sections.push_back(std::make_unique<PackageSection>(timeouts.silence));
+    sections.push_back(std::make_unique<ProxySection>(timeouts.confirmation));
     for (const Radio radio : {Radio::FlightMode, Radio::WiFi})
         sections.push_back(std::make_unique<RadioSection>(radio, timeouts.confirmation));
     sections.push_back(std::make_unique<CellularSection>(timeouts));

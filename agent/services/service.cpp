@@ -17,14 +17,19 @@ Service Service::telephony()
     return {QStringLiteral("org.ofono"), QStringLiteral("telephony service")};
 }
 
+Service Service::connectionManager()
+{
+    return {QStringLiteral("net.connman"), QStringLiteral("connection manager")};
+}
+
 Service Service::mdmProxy()
 {
     return {QStringLiteral("org.corvaneos.mdmproxy"), QStringLiteral("MDM proxy")};
 }
 
-Service Service::connectionManager()
+Service Service::packageKit()
 {
-    return {QStringLiteral("net.connman"), QStringLiteral("connection manager")};
+    return {QStringLiteral("org.freedesktop.PackageKit"), QStringLiteral("package manager")};
 }
 
 Service Service::bus()

@@ -17,10 +17,11 @@ struct Service {
     QString description; ///< for people
 
     static Service telephony();
-    static Service mdmProxy();
     /** The bus itself, which answers for services that come and go. */
     static Service bus();
     static Service connectionManager();
+    static Service mdmProxy();
+    static Service packageKit();
     static Service clock();
 
     /** "the telephony service (org.ofono)" */

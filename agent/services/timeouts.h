@@ -12,7 +12,8 @@ namespace Agent
 /** How long services are waited for. */
 struct Timeouts {
     std::chrono::milliseconds confirmation{std::chrono::seconds(25)}; ///< of a setting
-    std::chrono::milliseconds silence{std::chrono::minutes(5)}; ///< during a software update
+    std::chrono::milliseconds silence{
+        std::chrono::minutes(5)}; ///< during a software update, and for a package
     std::chrono::milliseconds look{std::chrono::seconds(30)}; ///< between looks at what nobody announces
 };
 

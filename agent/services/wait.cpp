@@ -13,7 +13,8 @@ namespace Agent
 namespace
 {
 
-const QLatin1String refusals(R"(^Method call failed: |GetAll\(\) failed: |^search\(\) failed: )");
+const QLatin1String refusals(
+    R"(^Method call failed: |GetAll\(\) failed: |^search\(\) failed: |^The connection manager refused )");
 
 QString seconds(std::chrono::milliseconds time)
 {

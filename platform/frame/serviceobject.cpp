@@ -140,20 +140,25 @@ void ServiceObject::ownerChanged()
     }
 }
 
+DBusSignal ServiceObject::signalOf(const Connection &connection) const
+{
+    return {m_owner, m_path, m_interface, QLatin1String(connection.member)};
+}
+
 void ServiceObject::connectSignals()
 {
-    QDBusConnection bus = QDBusConnection::systemBus();
+    const QDBusConnection bus = QDBusConnection::systemBus();
     for (const Connection &each : qAsConst(m_connections))
-        bus.connect(m_owner, m_path, m_interface, QLatin1String(each.member), each.receiver, each.slot);
+        connectDBusSignal(bus, signalOf(each), each.receiver, each.slot);
 }
 
 void ServiceObject::disconnectSignals()
 {
     if (m_owner.isEmpty())
         return;
-    QDBusConnection bus = QDBusConnection::systemBus();
+    const QDBusConnection bus = QDBusConnection::systemBus();
     for (const Connection &each : qAsConst(m_connections))
-        bus.disconnect(m_owner, m_path, m_interface, QLatin1String(each.member), each.receiver, each.slot);
+        disconnectDBusSignal(bus, signalOf(each), each.receiver, each.slot);
 }
 
 QDBusPendingCall ServiceObject::send(const QString &path, QLatin1String method,

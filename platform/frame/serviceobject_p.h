@@ -2,6 +2,8 @@
 #ifndef CORVANEMDM_PLATFORM_FRAME_SERVICEOBJECT_P_H
 #define CORVANEMDM_PLATFORM_FRAME_SERVICEOBJECT_P_H
 
+#include "signalconnection_p.h"
+
 #include <QtCore/QObject>
 #include <QtCore/QSharedPointer>
 #include <QtCore/QString>
@@ -116,6 +118,7 @@ private:
     };
 
     QDBusPendingCall send(const QString &path, QLatin1String method, const QVariantList &arguments) const;
+    DBusSignal signalOf(const Connection &connection) const;
     void connectSignals();
     void disconnectSignals();
     void ownerChanged();

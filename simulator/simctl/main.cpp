@@ -2,6 +2,7 @@
 #include "busaddress.h"
 #include "controlnames.h"
 #include "glibpointers.h"
+#include "secrets.h"
 
 #include <QtCore/QDateTime>
 #include <QtCore/QJsonArray>
@@ -291,6 +292,7 @@ struct JournalOptions {
     bool json = false;
     bool follow = false;
     bool clear = false;
+    bool secrets = false;
 };
 
 /** Prints one entry, a (ttsssssss), and returns its number. */
@@ -309,6 +311,8 @@ quint64 printEntry(GVariant *entry, const JournalOptions &options)
                   &signature, &arguments);
     if (!options.service.empty() && options.service != service)
         return number;
+    const std::string shown
+        = options.secrets ? arguments : argumentsWithoutSecrets({interface, member, signature, arguments});
     if (options.json) {
         const QJsonObject object{
             {QStringLiteral("number"), double(number)},
@@ -319,14 +323,14 @@ quint64 printEntry(GVariant *entry, const JournalOptions &options)
             {QStringLiteral("interface"), QString::fromUtf8(interface)},
             {QStringLiteral("member"), QString::fromUtf8(member)},
             {QStringLiteral("signature"), QString::fromUtf8(signature)},
-            {QStringLiteral("arguments"), QString::fromUtf8(arguments)},
+            {QStringLiteral("arguments"), QString::fromStdString(shown)},
         };
         std::printf("%s\n", QJsonDocument(object).toJson(QJsonDocument::Compact).constData());
     } else {
         const QString clock
             = QDateTime::fromMSecsSinceEpoch(qint64(time / 1000)).toString(QStringLiteral("hh:mm:ss.zzz"));
         std::printf("%llu  %s  %s  %s  %s  %s.%s%s\n", static_cast<unsigned long long>(number),
-                    qPrintable(clock), service, sender, path, interface, member, arguments);
+                    qPrintable(clock), service, sender, path, interface, member, shown.c_str());
     }
     std::fflush(stdout);
     return number;
@@ -581,6 +585,7 @@ int main(int argc, char *argv[])
     reading->add_option("--service", journal.service, "only calls of this service");
     reading->add_flag("--follow", journal.follow, "go on with each new call");
     reading->add_flag("--json", journal.json, "one JSON object a line");
+    reading->add_flag("--secrets", journal.secrets, "show passwords as they are, in place of ***");
     reading->add_flag("--clear", journal.clear, "forget all entries instead");
 
     CLI::App *looking = add("state", "print the state of the phone, or of one part of it",

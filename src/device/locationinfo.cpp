@@ -4,6 +4,7 @@
 #include "frame/blockingquery_p.h"
 #include "frame/mdmproxy_p.h"
 #include "locationinfo_p.h"
+#include "platform/frame/signalconnection_p.h"
 
 #include <QtDBus/QDBusConnection>
 
@@ -44,11 +45,14 @@ LocationInfoPrivate::LocationInfoPrivate(LocationInfo *info)
 
 void LocationInfoPrivate::connectSignals()
 {
-    QDBusConnection bus = QDBusConnection::systemBus();
-    bus.connect(MdmProxy::Service, MdmProxy::LocationInfo.path, MdmProxy::LocationInfo.interface,
-                QStringLiteral("positionChanged"), this, SLOT(handlePositionChanged(QString)));
-    bus.connect(MdmProxy::Service, MdmProxy::LocationInfo.path, MdmProxy::LocationInfo.interface,
-                QStringLiteral("satellitesChanged"), this, SLOT(handleSatellitesChanged(int, int)));
+    const auto follow = [this](const QString &name, const char *slot) {
+        connectDBusSignal(
+            QDBusConnection::systemBus(),
+            {MdmProxy::Service, MdmProxy::LocationInfo.path, MdmProxy::LocationInfo.interface, name}, this,
+            slot);
+    };
+    follow(QStringLiteral("positionChanged"), SLOT(handlePositionChanged(QString)));
+    follow(QStringLiteral("satellitesChanged"), SLOT(handleSatellitesChanged(int, int)));
 }
 
 void LocationInfoPrivate::startUpdates()

@@ -2,6 +2,7 @@
 #include <corvanemdm/notificationinfo.h>
 
 #include "frame/blockingquery_p.h"
+#include "frame/marshalling_p.h"
 #include "frame/mdmproxy_p.h"
 #include "notificationinfo_p.h"
 
@@ -147,6 +148,9 @@ bool expandList(QVariantList *list, int depth)
 
 QDBusArgument &operator<<(QDBusArgument &out, const NotificationData &data)
 {
+    // What cannot be sent is refused before anything is open.
+    if (!isMarshallable(data.remoteActions))
+        return out << QDBusVariant();
     out.beginStructure();
     out << data.id << data.urgency << data.owner << data.category << data.appName << data.appIcon
         << data.summary << data.body << data.subText << data.timestamp;

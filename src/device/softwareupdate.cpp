@@ -3,6 +3,7 @@
 
 #include "frame/blockingquery_p.h"
 #include "frame/mdmproxy_p.h"
+#include "platform/frame/signalconnection_p.h"
 #include "softwareupdate_p.h"
 
 #include <QtDBus/QDBusConnection>
@@ -23,9 +24,10 @@ SoftwareUpdate::SoftwareUpdate(QObject *parent)
     , d(new SoftwareUpdatePrivate)
 {
     const auto forward = [this](const char *name, const char *signal) {
-        QDBusConnection::systemBus().connect(MdmProxy::Service, MdmProxy::SoftwareUpdate.path,
-                                             MdmProxy::SoftwareUpdate.interface, QLatin1String(name), this,
-                                             signal);
+        connectDBusSignal(QDBusConnection::systemBus(),
+                          {MdmProxy::Service, MdmProxy::SoftwareUpdate.path,
+                           MdmProxy::SoftwareUpdate.interface, QLatin1String(name)},
+                          this, signal);
     };
     forward("softwareUpdateInfoChanged", SIGNAL(softwareUpdateInfoChanged()));
     forward("softwareUpdateDownloading", SIGNAL(softwareUpdateDownloading(QString)));

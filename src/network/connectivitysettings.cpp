@@ -3,6 +3,7 @@
 
 #include "connectivitysettings_p.h"
 #include "frame/objectpathproperties_p.h"
+#include "platform/frame/signalconnection_p.h"
 
 #include <QtCore/QDebug>
 #include <QtDBus/QDBusConnection>
@@ -341,15 +342,15 @@ void ConnectivitySettingsPrivate::createNetworkManager()
 
 void ConnectivitySettingsPrivate::createInterfaces()
 {
-    QDBusConnection bus = QDBusConnection::systemBus();
+    const QDBusConnection bus = QDBusConnection::systemBus();
     wlanTechInterface
         = new QDBusInterface(ConnmanService, WlanTechnologyPath, ConnmanTechnologyInterface, bus, this);
     connmanManagerInterface
         = new QDBusInterface(ConnmanService, RootPath, ConnmanManagerInterface, bus, this);
-    bus.connect(ConnmanService, WlanTechnologyPath, ConnmanTechnologyInterface, PropertyChanged, this,
-                SLOT(wlanTechPropertyChanged(QString, QDBusVariant)));
-    bus.connect(ConnmanService, RootPath, ConnmanManagerInterface, PropertyChanged, this,
-                SLOT(connmanManagerPropertyChanged(QString, QDBusVariant)));
+    connectDBusSignal(bus, {ConnmanService, WlanTechnologyPath, ConnmanTechnologyInterface, PropertyChanged},
+                      this, SLOT(wlanTechPropertyChanged(QString, QDBusVariant)));
+    connectDBusSignal(bus, {ConnmanService, RootPath, ConnmanManagerInterface, PropertyChanged}, this,
+                      SLOT(connmanManagerPropertyChanged(QString, QDBusVariant)));
 }
 
 bool ConnectivitySettingsPrivate::isReady() const

@@ -4,6 +4,7 @@
 #include "callstatistics_p.h"
 #include "frame/asynccommand_p.h"
 #include "frame/mdmproxy_p.h"
+#include "platform/frame/signalconnection_p.h"
 
 #include <QtCore/QDebug>
 #include <QtDBus/QDBusConnection>
@@ -73,10 +74,11 @@ CallStatisticsPrivate::CallStatisticsPrivate(CallStatistics *statistics)
 
 void CallStatisticsPrivate::connectSignal()
 {
-    QDBusConnection::systemBus().connect(
-        MdmProxy::Service, MdmProxy::CallStatistics.path, MdmProxy::CallStatistics.interface,
-        QStringLiteral("searchFinished"), this,
-        SLOT(handleSearchFinished(bool, QList<Corvane::Mdm::CallStatisticsPrivate::StatisticData>)));
+    connectDBusSignal(
+        QDBusConnection::systemBus(),
+        {MdmProxy::Service, MdmProxy::CallStatistics.path, MdmProxy::CallStatistics.interface,
+         QStringLiteral("searchFinished")},
+        this, SLOT(handleSearchFinished(bool, QList<Corvane::Mdm::CallStatisticsPrivate::StatisticData>)));
 }
 
 void CallStatisticsPrivate::search(const CallStatistics::Filter &filter)

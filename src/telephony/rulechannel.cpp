@@ -1,4 +1,5 @@
 // SPDX-License-Identifier: LGPL-2.1-or-later
+#include "platform/frame/signalconnection_p.h"
 #include "rulechannel_p.h"
 
 #include <QtCore/QPointer>
@@ -43,8 +44,9 @@ bool RuleChannel::hasRuleForImsi(const QString &imsi) const
 void RuleChannel::connectSignal(const char *signal, QObject *owner, const char *slot,
                                 const char *failure) const
 {
-    if (!QDBusConnection::systemBus().connect(OfonoService, m_names.path, m_names.interface,
-                                              QLatin1String(signal), owner, slot))
+    if (!connectDBusSignal(QDBusConnection::systemBus(),
+                           {OfonoService, m_names.path, m_names.interface, QLatin1String(signal)}, owner,
+                           slot))
         qWarning() << failure;
 }
 

@@ -2,6 +2,7 @@
 #include <corvanemdm/siminfo.h>
 
 #include "frame/asynccommand_p.h"
+#include "platform/frame/signalconnection_p.h"
 #include "siminfo_p.h"
 
 #include <mlite/mgconfitem.h>
@@ -342,9 +343,9 @@ QDBusInterface *SimInfoPrivate::createInterface(
     const QString &path, QLatin1String interface, const char *changedSlot,
     void (SimInfoPrivate::*finishedSlot)(QDBusPendingCallWatcher *))
 {
-    QDBusConnection bus = QDBusConnection::systemBus();
+    const QDBusConnection bus = QDBusConnection::systemBus();
     auto *object = new QDBusInterface(OfonoService, path, interface, bus, this);
-    bus.connect(OfonoService, path, interface, PropertyChanged, this, changedSlot);
+    connectDBusSignal(bus, {OfonoService, path, interface, PropertyChanged}, this, changedSlot);
     // The answer goes with the interface that asked.
     watchCall(object->asyncCall(GetProperties), this, finishedSlot, object);
     return object;
@@ -354,8 +355,9 @@ void SimInfoPrivate::deleteInterface(QDBusInterface *interface, const char *chan
 {
     if (!interface)
         return;
-    QDBusConnection::systemBus().disconnect(OfonoService, interface->path(), interface->interface(),
-                                            PropertyChanged, this, changedSlot);
+    disconnectDBusSignal(QDBusConnection::systemBus(),
+                         {OfonoService, interface->path(), interface->interface(), PropertyChanged}, this,
+                         changedSlot);
     delete interface;
 }
 

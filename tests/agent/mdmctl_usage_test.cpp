@@ -4,6 +4,24 @@
 
 #include <QtTest/QtTest>
 
+namespace
+{
+
+/** The commands that the help lists. */
+QStringList families()
+{
+    const QString help = Mdmctl::run({QStringLiteral("--help")}).output;
+    const int begin = help.indexOf(QStringLiteral("Commands:\n"));
+    const QString list = help.mid(begin, help.indexOf(QStringLiteral("\n\n"), begin) - begin);
+    QStringList names;
+    const QStringList lines = list.split(QLatin1Char('\n')).mid(1);
+    for (const QString &line : lines)
+        names.append(line.simplified().section(QLatin1Char(' '), 0, 0));
+    return names;
+}
+
+} // namespace
+
 /** Help, mistakes and completion: what mdmctl does without asking the phone anything. */
 class MdmctlUsageTest : public QObject
 {
@@ -32,21 +50,6 @@ namespace
 QStringList words(const char *text)
 {
     return QString::fromUtf8(text).split(QLatin1Char(' '), Qt::SkipEmptyParts);
-}
-
-/** The families of commands, in the order of the help. */
-QStringList families()
-{
-    const QString help = Mdmctl::run({QStringLiteral("--help")}).output;
-    const QString list
-        = help.section(QStringLiteral("\nCommands:\n"), 1).section(QStringLiteral("\n\n"), 0, 0);
-    QStringList names;
-    const QStringList lines = list.split(QLatin1Char('\n'));
-    for (const QString &line : lines) {
-        if (!line.section(QLatin1Char(' '), 2, 2).isEmpty())
-            names.append(line.section(QLatin1Char(' '), 2, 2));
-    }
-    return names;
 }
 
 } // namespace
@@ -118,8 +121,9 @@ void MdmctlUsageTest::mistakesAreToldInOneLine_data()
     const auto row = [](const char *arguments, const char *message) {
         QTest::newRow(arguments) << QString::fromUtf8(message);
     };
-    QTest::newRow("") << QStringLiteral(R"("mdmctl" needs a command: must be one of "%1")")
-                             .arg(families().join(QStringLiteral("\", \"")));
+    row("",
+        qPrintable(QStringLiteral("\"mdmctl\" needs a command: must be one of \"%1\"")
+                       .arg(families().join(QStringLiteral("\", \"")))));
     row("calls --json",
         R"("mdmctl calls" needs a command: must be one of "show", "add", "remove", "set", "clear", )"
         R"("default", "watch")");
@@ -180,7 +184,7 @@ void MdmctlUsageTest::bashCompletes_data()
         QTest::newRow(line) << QString::fromUtf8(expected);
     };
     // A line that ends with a space has an empty word at the cursor.
-    QTest::newRow("mdmctl ") << families().join(QLatin1Char(' '));
+    row("mdmctl ", qPrintable(families().join(QLatin1Char(' '))));
     row("mdmctl sim ", "list watch imei imsi iccid numbers");
     row("mdmctl po", "policy");
     row("mdmctl calls ", "show add remove set clear default watch");

@@ -3,6 +3,7 @@
 #include "frame/blockingquery_p.h"
 #include "frame/mdmproxy_p.h"
 #include "frame/objectpathproperties_p.h"
+#include "platform/frame/signalconnection_p.h"
 
 #include "messagelog.h"
 #include "phone.h"
@@ -75,6 +76,21 @@ public:
     QString signature;
 };
 
+/** Listens to a service by name, as the features do. */
+class Listener : public QObject
+{
+    Q_OBJECT
+
+public Q_SLOTS:
+    void textArrived(const QString &text) { seen.append(text); }
+    void propertyArrived(const QString &name, const QDBusVariant &) { seen.append(name); }
+    void messageArrived(const QDBusMessage &message) { seen.append(message.signature()); }
+    void somethingArrived() { seen.append(QStringLiteral("something")); }
+
+public:
+    QStringList seen;
+};
+
 class FrameTest : public QObject
 {
     Q_OBJECT
@@ -94,6 +110,9 @@ private Q_SLOTS:
     void objectPathPropertiesFromTheWire();
     void objectPathPropertiesThereAndBack();
     void triggersThereAndBack();
+    void signalsOfOtherTypesAreNotTaken_data();
+    void signalsOfOtherTypesAreNotTaken();
+    void signalConnectionsEnd();
 
 private:
     template <typename T> T thereAndBack(const T &value, QString *signature);
@@ -276,6 +295,61 @@ void FrameTest::triggersThereAndBack()
     const Maemo::Timed::Event::Triggers back = thereAndBack(triggers, &signature);
     QCOMPARE(signature, QStringLiteral("a{uu}"));
     QCOMPARE(back, triggers);
+}
+
+void FrameTest::signalsOfOtherTypesAreNotTaken_data()
+{
+    QTest::addColumn<QByteArray>("slot");
+    QTest::addColumn<QStringList>("expected");
+
+    // Arrays, structures and maps are what QtDBus itself would end the program for.
+    const QString text = QStringLiteral("text");
+    QTest::newRow("text") << QByteArray(SLOT(textArrived(QString))) << QStringList{text};
+    QTest::newRow("property") << QByteArray(SLOT(propertyArrived(QString, QDBusVariant)))
+                              << QStringList{text};
+    QTest::newRow("message") << QByteArray(SLOT(messageArrived(QDBusMessage)))
+                             << QStringList{QStringLiteral("s"),     QStringLiteral("sv"),
+                                            QStringLiteral("a{sv}"), QStringLiteral("as"),
+                                            QStringLiteral("u"),     QString()};
+    const QString something = QStringLiteral("something");
+    QTest::newRow("nothing") << QByteArray(SLOT(somethingArrived()))
+                             << QStringList{something, something, something, something, something, something};
+}
+
+void FrameTest::signalsOfOtherTypesAreNotTaken()
+{
+    QFETCH(QByteArray, slot);
+    QFETCH(QStringList, expected);
+    Listener listener;
+    const DBusSignal signal{MdmProxy::Service, QStringLiteral("/example"), Echo, QStringLiteral("Changed")};
+    QVERIFY(connectDBusSignal(QDBusConnection::systemBus(), signal, &listener, slot));
+
+    const QVariantMap map{{QStringLiteral("key"), 1}};
+    const QList<QVariantList> messages{
+        {QStringLiteral("text")},
+        {QStringLiteral("text"), QVariant::fromValue(QDBusVariant(map))},
+        {map},
+        {QStringList{QStringLiteral("a"), QStringLiteral("b")}},
+        {3U},
+        {},
+    };
+    for (const QVariantList &arguments : messages)
+        m_phone->emitSignal(signal.service, signal.path, signal.interface, signal.member, arguments);
+    QCOMPARE(listener.seen, expected);
+}
+
+void FrameTest::signalConnectionsEnd()
+{
+    Listener listener;
+    const DBusSignal signal{MdmProxy::Service, QStringLiteral("/example"), Echo, QStringLiteral("Changed")};
+    const char *const slot = SLOT(textArrived(QString));
+    QVERIFY(connectDBusSignal(QDBusConnection::systemBus(), signal, &listener, slot));
+    QVERIFY(disconnectDBusSignal(QDBusConnection::systemBus(), signal, &listener, slot));
+    m_phone->emitSignal(signal.service, signal.path, signal.interface, signal.member,
+                        {QStringLiteral("text")});
+    QCOMPARE(listener.seen, QStringList());
+
+    QVERIFY(!connectDBusSignal(QDBusConnection::systemBus(), signal, &listener, SLOT(absent(QString))));
 }
 
 QTEST_GUILESS_MAIN(FrameTest)

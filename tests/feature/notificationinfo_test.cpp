@@ -6,6 +6,7 @@
 #include <corvanemdm/notificationinfo.h>
 
 #include <QtCore/QJsonArray>
+#include <QtCore/QRegularExpression>
 #include <QtCore/QTimeZone>
 #include <QtDBus/QDBusArgument>
 #include <QtDBus/QDBusMetaType>
@@ -206,6 +207,7 @@ private Q_SLOTS:
     void typesThatNoActionHas();
     void whatIsLeftAlone();
     void oneMalformedActionSparesTheOthers();
+    void actionsThatCannotBeSent_data();
     void actionsThatCannotBeSent();
     void errorsGiveEmptyValues();
     void answersOfAnotherType_data();
@@ -566,11 +568,26 @@ void NotificationInfoTest::oneMalformedActionSparesTheOthers()
     QCOMPARE(read.at(1).remoteActions.first().toMap(), good);
 }
 
+void NotificationInfoTest::actionsThatCannotBeSent_data()
+{
+    QTest::addColumn<QVariantList>("actions");
+    const QString key = QStringLiteral("key");
+    const QVariant unknown = QVariant::fromValue(QRegularExpression());
+    QTest::newRow("invalid") << QVariantList{QVariant()};
+    QTest::newRow("after a good one") << QVariantList{QVariantMap{{key, 1}}, QVariant()};
+    QTest::newRow("in a map") << QVariantList{QVariantMap{{key, QVariant()}}};
+    QTest::newRow("in a list in a hash") << QVariantList{QVariantHash{{key, QVariantList{1, QVariant()}}}};
+    QTest::newRow("of a type that the wire does not have") << QVariantList{QVariantMap{{key, unknown}}};
+    QTest::newRow("in a box") << QVariantList{variant(QDBusVariant(unknown))};
+}
+
+/** Leaves nothing behind either, which the sanitizers see. */
 void NotificationInfoTest::actionsThatCannotBeSent()
 {
+    QFETCH(QVariantList, actions);
     NotificationInfo info;
     NotificationData data = dataNamed(QStringLiteral("Unsendable"));
-    data.remoteActions = {QVariant()};
+    data.remoteActions = actions;
     m_phone->takeJournal(Service);
     MessageLog log;
     QCOMPARE(info.createNotification(data), 0U);

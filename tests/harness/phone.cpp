@@ -159,6 +159,7 @@ QStringList Phone::takeJournal(const QStringList &services, bool withInterfaces)
         if (!services.contains(entry.service)
             || entry.interface.startsWith(QLatin1String("org.freedesktop.DBus")))
             continue;
+        m_lastSignature = entry.signature;
         const QString member
             = withInterfaces ? entry.interface + QLatin1Char('.') + entry.member : entry.member;
         calls.append(entry.path + QLatin1Char(' ') + member + QLatin1Char(' ') + entry.arguments);

@@ -61,6 +61,9 @@ public:
     /** The same as "path interface.member arguments". */
     QStringList takeJournalWithInterfaces(const QString &service);
 
+    /** The D-Bus signature of the last call that was taken from the journal. */
+    QString lastSignature() const { return m_lastSignature; }
+
     void act(const QString &action, const QStringList &arguments);
     /** The phone's own view of its state. */
     QJsonObject state() const;
@@ -73,6 +76,7 @@ private:
                   const QVariantMap &options);
 
     quint64 m_journalPosition = 0;
+    QString m_lastSignature;
 };
 
 #endif // CORVANE_TEST_PHONE_H

@@ -4,10 +4,17 @@
 #include "waiting.h"
 
 #include <corvanemdm/callstatistics.h>
+#include <corvanemdm/certificates.h>
+#include <corvanemdm/networkdatacounter.h>
 #include <corvanemdm/simfilter.h>
 #include <corvanemdm/siminfo.h>
 
+#include <QtCore/QUrl>
+
 using Corvane::Mdm::CallStatistics;
+using Corvane::Mdm::CertificateFile;
+using Corvane::Mdm::Certificates;
+using Corvane::Mdm::NetworkDataCounter;
 using Corvane::Mdm::SimFilter;
 using Corvane::Mdm::SimInfo;
 
@@ -23,6 +30,21 @@ QString text(const SimFilter::Rule &rule)
 QString text(const CallStatistics::Result &result)
 {
     return result.time.toString(Qt::ISODate) + QLatin1Char('=') + QString::number(result.value);
+}
+
+QString text(const NetworkDataCounter::Update &update)
+{
+    static const char *const types[] = {"home", "roaming", "wlan"};
+    return QStringLiteral("%1 %2 tx:%3 rx:%4 time:%5")
+        .arg(update.identifier, QLatin1String(types[update.type]))
+        .arg(update.txBytes)
+        .arg(update.rxBytes)
+        .arg(update.time);
+}
+
+QString text(const QUrl &url)
+{
+    return url.toString();
 }
 
 template <typename T> QString text(const QList<T> &list)
@@ -62,6 +84,14 @@ QString text(int type, const void *value)
         return text(*static_cast<const QList<CallStatistics::Result> *>(value));
     if (type == qMetaTypeId<SimInfo::SimState>())
         return simStateText(*static_cast<const SimInfo::SimState *>(value));
+    if (type == qMetaTypeId<CertificateFile>())
+        return static_cast<const CertificateFile *>(value)->fileName();
+    if (type == qMetaTypeId<Certificates::Result>())
+        return QString::number(*static_cast<const Certificates::Result *>(value));
+    if (type == qMetaTypeId<NetworkDataCounter::Update>())
+        return text(*static_cast<const NetworkDataCounter::Update *>(value));
+    if (type == qMetaTypeId<QList<QUrl>>())
+        return text(*static_cast<const QList<QUrl> *>(value));
     if (type == QMetaType::UnknownType)
         return QStringLiteral("<type unknown to the meta-object system>");
     return text(QVariant(type, value));
@@ -89,7 +119,8 @@ SignalSequence::SignalSequence(QObject *object)
 {
     const QMetaObject *metaObject = object->metaObject();
     const int firstSlot = QObject::staticMetaObject.methodCount();
-    for (int index = metaObject->methodOffset(); index < metaObject->methodCount(); ++index) {
+    // From all classes but QObject.
+    for (int index = firstSlot; index < metaObject->methodCount(); ++index) {
         const QMetaMethod method = metaObject->method(index);
         if (method.methodType() != QMetaMethod::Signal)
             continue;

@@ -54,6 +54,24 @@ says 0 '' journal --service org.corvaneos.mdmproxy
 says 0 '' journal --after 100000
 says 0 '.*\{.*"member":"GetAll".*' journal --json --service org.ofono
 
+# Secrets are shown on request alone: those of the contract, and what is called a password elsewhere.
+create_account() {
+    gdbus call --system -d org.corvaneos.mdmproxy -o /Corvane/Mdm/Proxy/Accounts \
+        -m org.corvaneos.mdmproxy.accounts."$1" "${@:2}" >/dev/null 2>&1 || true
+}
+says 0 '' journal --clear
+create_account createAccount corvane-cloud corvane-cloud-sync lena hush '' '{"host": <"h">, "Password": <"hush">}' false
+shown="'corvane-cloud', 'corvane-cloud-sync', 'lena', '\*\*\*', '', \{'host': <'h'>, 'Password': <'\*\*\*'>\}, false\)"
+says 0 ".*accounts\\.createAccount\\($shown" journal
+says 0 ".*\"arguments\":\"\\($shown\".*" journal --json
+says 0 ".*'lena', 'hush', '', \{'host': <'h'>, 'Password': <'hush'>\}, false\)" journal --secrets
+says 0 '' journal --clear
+create_account createAccount hush
+create_account deleteAccount 999
+gdbus call --system -d org.ofono -o /ril_0 -m org.ofono.SimManager.SetProperty Passphrase '<"hush">' >/dev/null 2>&1 || true
+says 0 $'.*createAccount\\(\\*\\*\\*\\)\n.*deleteAccount\\(uint64 999,\\)\n.*SetProperty\\(\'Passphrase\', <\'\\*\\*\\*\'>\\)' journal
+get_all >/dev/null
+
 mkfifo "$work/journal"
 corvane-simctl journal --follow >"$work/journal" &
 follower=$!

@@ -1,14 +1,21 @@
 // SPDX-License-Identifier: LGPL-2.1-or-later
 // Uses every public class from outside of the project. Where no service answers, it must work as well.
 #include <corvanemdm/applications.h>
+#include <corvanemdm/autostart.h>
 #include <corvanemdm/batteryinfo.h>
 #include <corvanemdm/callstatistics.h>
+#include <corvanemdm/certificates.h>
 #include <corvanemdm/connectivitysettings.h>
 #include <corvanemdm/corvanemdm_global.h>
 #include <corvanemdm/datetimesettings.h>
+#include <corvanemdm/emailaccountprovisioner.h>
+#include <corvanemdm/genericaccountprovisioner.h>
 #include <corvanemdm/locationinfo.h>
 #include <corvanemdm/locationsettings.h>
+#include <corvanemdm/netproxy.h>
+#include <corvanemdm/networkdatacounter.h>
 #include <corvanemdm/notificationinfo.h>
+#include <corvanemdm/provisioner.h>
 #include <corvanemdm/simfilter.h>
 #include <corvanemdm/siminfo.h>
 #include <corvanemdm/simmobiledatafilter.h>
@@ -69,6 +76,39 @@ bool simVoiceCallFilterWorks()
     return !filter.ready() && filter.dialRules().isEmpty() && !filter.clearIncomingRules();
 }
 
+bool provisionersWork()
+{
+    Accounts::EmailAccountProvisioner email;
+    email.setEmailAddress(QStringLiteral("a@example.org"));
+    Accounts::GenericAccountProvisioner generic;
+    generic.setUsername(QStringLiteral("a"));
+    Accounts::Provisioner &provisioner = generic;
+    // Where nobody answers, an account cannot be deleted either.
+    return !email.canCreateAccount() && !email.createAccount() && email.error() == 1
+        && !provisioner.deleteAccount(0) && provisioner.error() != 0 && !provisioner.errorMessage().isEmpty();
+}
+
+bool certificatesWork()
+{
+    const Certificates certificates;
+    QObject::connect(&certificates, &Certificates::installFinished, &certificates,
+                     [](const CertificateFile &, Certificates::Result) {});
+    const QList<CertificateFile> files = certificates.installedFiles() + certificates.blacklistedFiles();
+    return CertificateFile().isNull()
+        && std::none_of(files.begin(), files.end(),
+                        [](const CertificateFile &file) { return file.isNull(); });
+}
+
+bool autostartWorks()
+{
+    Autostart autostart;
+    Autostart::Result result = Autostart::AlreadyAutostarted;
+    const QStringList entries = autostart.query(result);
+    // Where nobody answers, nothing starts; an application that there is not cannot be added anywhere.
+    return (result == Autostart::InternalError || result == Autostart::Success) && entries.isEmpty()
+        && autostart.add(QStringLiteral("no-such.desktop")) != Autostart::Success;
+}
+
 bool otherFiltersWork()
 {
     SimSmsFilter texts;
@@ -118,6 +158,25 @@ bool locationInfoWorks()
     return info.satellitesInUse() == -1 && !position.timestamp.isValid() && position.latitude == 0.0;
 }
 
+bool netProxyWorks()
+{
+    NetProxy proxy;
+    QObject::connect(&proxy, &NetProxy::validChanged, &proxy, [](bool) {});
+    // Nothing is selected before the event loop has run.
+    return !proxy.isValid() && proxy.type() == NetProxy::Invalid && !proxy.setType(NetProxy::Direct)
+        && proxy.getIdentifiers(QStringLiteral("global")) == QStringList(QStringLiteral("global"));
+}
+
+bool networkDataCounterWorks()
+{
+    NetworkDataCounter counter;
+    int updates = 0;
+    QObject::connect(&counter, &NetworkDataCounter::counterUpdate, &counter,
+                     [&updates](const NetworkDataCounter::Update &) { ++updates; });
+    counter.setUpdateInterval(5);
+    return !counter.active() && counter.updateInterval() == 5 && updates == 0;
+}
+
 bool locationSettingsWork()
 {
     const LocationSettings settings;
@@ -158,9 +217,11 @@ int main(int argc, char **argv)
 {
     QCoreApplication application(argc, argv);
     bool (*const checks[])() = {
-        simFilterWorks,    simInfoWorks,         connectivitySettingsWork, simVoiceCallFilterWorks,
-        otherFiltersWork,  callStatisticsWork,   applicationsWork,         notificationInfoWorks,
-        locationInfoWorks, locationSettingsWork, dateTimeSettingsWork,     batteryInfoWorks,
+        simFilterWorks,          simInfoWorks,         connectivitySettingsWork, simVoiceCallFilterWorks,
+        otherFiltersWork,        callStatisticsWork,   applicationsWork,         notificationInfoWorks,
+        locationInfoWorks,       locationSettingsWork, dateTimeSettingsWork,     batteryInfoWorks,
+        provisionersWork,        autostartWorks,       certificatesWork,         netProxyWorks,
+        networkDataCounterWorks,
     };
     const bool works
         = std::all_of(std::begin(checks), std::end(checks), [](bool (*check)()) { return check(); });
