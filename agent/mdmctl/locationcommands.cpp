@@ -1,8 +1,8 @@
 // SPDX-License-Identifier: LGPL-2.1-or-later
 #include "answer.h"
 #include "commands.h"
-#include "exitstatus.h"
 #include "output.h"
+#include "servicecommand.h"
 #include "settingcommands.h"
 #include "wait.h"
 
@@ -107,18 +107,7 @@ int runWatch(LocationInfo &info, const Values &values)
 
 Command command(const QString &name, const QString &summary, int (*run)(LocationInfo &, const Values &))
 {
-    Command command;
-    command.name = name;
-    command.summary = summary;
-    command.options = {jsonOption()};
-    command.run = [run](const Values &values) -> int {
-        const Reply running = Service::mdmProxy().ensureRunning();
-        if (!running.isDone())
-            return conclude(running);
-        LocationInfo info;
-        return run(info, values);
-    };
-    return command;
+    return serviceCommand(Service::mdmProxy(), name, summary, run);
 }
 
 } // namespace

@@ -1,8 +1,8 @@
 // SPDX-License-Identifier: LGPL-2.1-or-later
 #include "answer.h"
 #include "commands.h"
-#include "exitstatus.h"
 #include "output.h"
+#include "servicecommand.h"
 #include "suggestion.h"
 #include "table.h"
 
@@ -209,18 +209,7 @@ int runClose(NotificationInfo &info, const Values &values)
 
 Command command(const QString &name, const QString &summary, int (*run)(NotificationInfo &, const Values &))
 {
-    Command command;
-    command.name = name;
-    command.summary = summary;
-    command.options = {jsonOption()};
-    command.run = [run](const Values &values) -> int {
-        const Reply running = Service::mdmProxy().ensureRunning();
-        if (!running.isDone())
-            return conclude(running);
-        NotificationInfo info;
-        return run(info, values);
-    };
-    return command;
+    return serviceCommand(Service::mdmProxy(), name, summary, run);
 }
 
 /** The options that describe a notification, without the one for its summary if an argument is that. */
