@@ -60,8 +60,18 @@ ServiceOwner::ServiceOwner(const QString &service)
 {
     const QDBusConnection bus = QDBusConnection::systemBus();
     auto *watcher = new QDBusServiceWatcher(service, bus, QDBusServiceWatcher::WatchForOwnerChange, this);
+    // Receivers of ours may destroy the watcher, which must not have anything left to signal then.
     connect(watcher, &QDBusServiceWatcher::serviceOwnerChanged, this,
-            [this](const QString &, const QString &, const QString &newOwner) { setOwner(newOwner); });
+            [this](const QString &, const QString &oldOwner, const QString &newOwner) {
+                m_nextOwner = newOwner;
+                if (!oldOwner.isEmpty() && !newOwner.isEmpty())
+                    setOwner(newOwner);
+            });
+    const auto takeNextOwner = [this] {
+        setOwner(QString(m_nextOwner));
+    };
+    connect(watcher, &QDBusServiceWatcher::serviceRegistered, this, takeNextOwner);
+    connect(watcher, &QDBusServiceWatcher::serviceUnregistered, this, takeNextOwner);
 
     auto *answer = new QDBusPendingCallWatcher(bus.asyncCall(question()), this);
     connect(answer, &QDBusPendingCallWatcher::finished, this, [this](QDBusPendingCallWatcher *finished) {

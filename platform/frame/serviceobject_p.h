@@ -65,6 +65,7 @@ private:
 
     const QString m_service;
     QString m_owner;
+    QString m_nextOwner; // of a change that the watcher has not told to its end
 };
 
 /** One interface of one object of a service, or of all its objects, through the comings and goings of the

@@ -123,6 +123,7 @@ private Q_SLOTS:
     void deletedInFlight_data();
     void deletedInFlight();
     void deletedByAReceiver();
+    void deletedWhenTheServiceLeaves();
     void serviceStopsAndStarts();
     void absentService();
     void serviceThatComesLater();
@@ -953,6 +954,18 @@ void SimInfoTest::deletedByAReceiver()
     connect(info, &SimInfo::simStateChanged, info, [info] { delete info; });
     act("modem remove 0");
     QVERIFY(waitUntil([&] { return !alive; }));
+    settle();
+}
+
+void SimInfoTest::deletedWhenTheServiceLeaves()
+{
+    auto *info = new SimInfo;
+    const QPointer<SimInfo> alive(info);
+    QVERIFY(waitForStates(*info, {Sim0, Sim1}));
+    connect(info, &SimInfo::availableChanged, info, [info] { delete info; });
+    m_phone->stopService(Service);
+    QVERIFY(waitUntil([&] { return !alive; }));
+    m_phone->startService(Service);
     settle();
 }
 
