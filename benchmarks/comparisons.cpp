@@ -34,6 +34,9 @@ constexpr Comparison Comparisons[] = {
      "list/demarshal+copy/100000", 2},
     {"whole list, 100,000 rules / 10,000 rules", "list/library/100000", "list/library/10000", 12},
     {"one rule added to 10,000 / one copy of the list", "rule/library/10000", "rule/copy/10000", 4},
+    {"1,000 notifications with nested actions / plain QtDBus demarshalling", "notifications/library/1000",
+     "notifications/QtDBus/1000", 0},
+    {"1,000 positions / hand-written QtDBus client", "positions/library/1000", "positions/QtDBus/1000", 0},
     {"loading the library / loading its dependencies", "load/library", "load/dependencies", 0},
 };
 

@@ -2,6 +2,7 @@
 #ifndef CORVANEMDM_PLATFORM_KEYFILE_P_H
 #define CORVANEMDM_PLATFORM_KEYFILE_P_H
 
+#include <QtCore/QByteArray>
 #include <QtCore/QFile>
 #include <QtCore/QString>
 #include <QtCore/QStringList>
@@ -17,8 +18,8 @@ public:
     explicit KeyFile(const QString &fileName)
         : m_file(g_key_file_new())
     {
-        g_key_file_load_from_file(m_file.get(), QFile::encodeName(fileName).constData(), G_KEY_FILE_NONE,
-                                  nullptr);
+        g_key_file_load_from_file(m_file.get(), QFile::encodeName(fileName).constData(),
+                                  G_KEY_FILE_KEEP_COMMENTS, nullptr);
     }
 
     QString text(const char *group, const char *key) const
@@ -41,6 +42,19 @@ public:
             return value;
         g_error_free(error);
         return missing;
+    }
+
+    void setText(const char *group, const char *key, const QString &value)
+    {
+        g_key_file_set_string(m_file.get(), group, key, value.toUtf8().constData());
+    }
+
+    /** What is to be written to a file, comments included. */
+    QByteArray toData() const
+    {
+        gsize size = 0;
+        const std::unique_ptr<gchar, Free> data(g_key_file_to_data(m_file.get(), &size, nullptr));
+        return QByteArray(data.get(), int(size));
     }
 
     /** The parts of a value that @p separator divides. */

@@ -42,6 +42,27 @@ guint32 MethodCall::number(gsize index) const
     return g_variant_get_uint32(Variant(g_variant_get_child_value(arguments(), index)).get());
 }
 
+guint64 MethodCall::bits(gsize index) const
+{
+    return g_variant_get_uint64(Variant(g_variant_get_child_value(arguments(), index)).get());
+}
+
+bool MethodCall::flag(gsize index) const
+{
+    return g_variant_get_boolean(Variant(g_variant_get_child_value(arguments(), index)).get());
+}
+
+QStringList MethodCall::texts(gsize index) const
+{
+    const Variant list(g_variant_get_child_value(arguments(), index));
+    QStringList values;
+    for (gsize i = 0; i < g_variant_n_children(list.get()); ++i) {
+        const Variant value(g_variant_get_child_value(list.get(), i));
+        values << QString::fromUtf8(g_variant_get_string(value.get(), nullptr));
+    }
+    return values;
+}
+
 void MethodCall::reply(GVariant *values)
 {
     g_dbus_method_invocation_return_value(m_invocation, values);
@@ -166,7 +187,8 @@ void BusConnection::watchSignal(const QString &service, const QString &member,
         this, nullptr);
 }
 
-void BusConnection::addObject(const QString &path, const QString &interface, MethodHandlers handlers)
+void BusConnection::addObject(const QString &path, const QString &interface, MethodHandlers handlers,
+                              PropertyReaders properties)
 {
     static const GDBusInterfaceVTable vtable = {
         [](GDBusConnection *, const gchar *, const gchar *, const gchar *, const gchar *member, GVariant *,
@@ -179,7 +201,10 @@ void BusConnection::addObject(const QString &path, const QString &interface, Met
                 call.fail(error);
             }
         },
-        nullptr,
+        [](GDBusConnection *, const gchar *, const gchar *, const gchar *, const gchar *name, GError **,
+           gpointer data) {
+            return static_cast<const Object *>(data)->properties.at(QString::fromUtf8(name))();
+        },
         nullptr,
         {},
     };
@@ -191,10 +216,16 @@ void BusConnection::addObject(const QString &path, const QString &interface, Met
                    (*method)->name);
     }
 
+    for (GDBusPropertyInfo **property = contract->properties; property && *property; ++property) {
+        if (!properties.count(QString::fromUtf8((*property)->name)))
+            qFatal("%s at %s has no %s", qUtf8Printable(interface), qUtf8Printable(path), (*property)->name);
+    }
+
     auto object = std::make_unique<Object>();
     object->path = path;
     object->interface = interface;
     object->handlers = std::move(handlers);
+    object->properties = std::move(properties);
     ErrorSlot error;
     object->registration = g_dbus_connection_register_object(
         m_connection.get(), path.toUtf8().constData(), contract, &vtable, object.get(), nullptr, &error);

@@ -6,6 +6,7 @@
 #include "glibpointers.h"
 
 #include <QtCore/QString>
+#include <QtCore/QStringList>
 
 #include <functional>
 #include <map>
@@ -54,6 +55,12 @@ public:
     QString text(gsize index) const;
     /** The argument at @p index, an unsigned number. */
     guint32 number(gsize index) const;
+    /** The argument at @p index, an unsigned number of 64 bits. */
+    guint64 bits(gsize index) const;
+    /** The argument at @p index, a boolean. */
+    bool flag(gsize index) const;
+    /** The argument at @p index, a list of strings. */
+    QStringList texts(gsize index) const;
 
     /** Answers with @p values, a tuple of the contract's type, or with nothing. */
     void reply(GVariant *values = nullptr);
@@ -66,6 +73,8 @@ private:
 
 using MethodHandler = std::function<void(MethodCall &)>;
 using MethodHandlers = std::map<QString, MethodHandler>;
+/** Gives the present value of each property. */
+using PropertyReaders = std::map<QString, std::function<GVariant *()>>;
 
 /** A private connection to the phone's bus with the objects that are offered over it. */
 class BusConnection
@@ -104,8 +113,9 @@ public:
     void watchSignal(const QString &service, const QString &member,
                      std::function<void(const QString &path)> handler);
 
-    /** Offers @p interface at @p path; each method of its contract has a handler. */
-    void addObject(const QString &path, const QString &interface, MethodHandlers handlers);
+    /** Offers @p interface at @p path; each method and each property of its contract has a handler. */
+    void addObject(const QString &path, const QString &interface, MethodHandlers handlers,
+                   PropertyReaders properties = {});
     void removeObject(const QString &path, const QString &interface);
 
     /** @p arguments is a tuple, or null for none; without a destination the signal is a broadcast. */
@@ -117,6 +127,7 @@ private:
         QString path;
         QString interface;
         MethodHandlers handlers;
+        PropertyReaders properties;
         guint registration = 0;
     };
 

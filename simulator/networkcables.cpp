@@ -6,8 +6,10 @@
 #include <QtCore/QJsonArray>
 
 #include <algorithm>
+#include <cerrno>
+#include <cstring>
+#include <fstream>
 #include <stdexcept>
-#include <sys/wait.h>
 #include <unistd.h>
 
 namespace Corvane
@@ -63,6 +65,14 @@ void run(const Tool &tool, const std::vector<std::string> &arguments)
     }
 }
 
+void writeFile(const std::string &name, const char *content)
+{
+    std::ofstream file(name);
+    file << content;
+    if (!file.flush())
+        throw std::runtime_error("cannot write " + name + ": " + std::strerror(errno));
+}
+
 } // namespace
 
 /** Two interfaces that are the ends of one cable; ours is the one that ConnMan takes no notice of. */
@@ -95,6 +105,18 @@ struct NetworkCables::Cable {
         run(ipTool, {"address", "add", network + ".1/24", "dev", ourEnd});
         setPlugged(true);
         serveAddresses();
+    }
+
+    /** oFono's driver for emulated modems counts on: with each of them that goes online. */
+    void alias(const std::string &stem)
+    {
+        constexpr int count = 200;
+        std::vector<std::string> arguments{"link", "property", "add", "dev", phoneEnd};
+        for (int number = 1; number < count; ++number) {
+            arguments.emplace_back("altname");
+            arguments.push_back(stem + std::to_string(number));
+        }
+        run(ipTool, arguments);
     }
 
     void setPlugged(bool plugged)
@@ -187,7 +209,12 @@ std::map<std::string, std::string> NetworkCables::prepare()
         cables.push_back(std::make_unique<Cable>("dummy0", "ve-cell", "198.51.100"));
         for (const std::unique_ptr<Cable> &cable : cables)
             cable->lay();
+        cables.back()->alias("dummy");
         m_cables = std::move(cables);
+        // What ConnMan comes back to from flight mode is what somebody once has switched on.
+        writeFile("/var/lib/connman/settings",
+                  "[global]\nOfflineMode=false\n\n[Wired]\nEnable=true\n\n"
+                  "[Cellular]\nEnable=true\n");
     }
     return {};
 }

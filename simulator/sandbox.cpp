@@ -104,6 +104,8 @@ void writeLayer(const PhoneFiles &files)
         makeFolders(layer + folder);
     for (const std::string &folder : files.writableFolders)
         makeFolders(layer + folder);
+    for (const std::string &folder : files.ownFolders)
+        makeFolders(layer + folder);
     for (const auto &[path, content] : files.files) {
         makeFolders(fs::path(layer + path).parent_path());
         writeFile(layer + path, content);
@@ -128,6 +130,13 @@ void mountOverlays()
                 "lowerdir=" + storage + "/layer" + folder + ":" + folder + ",upperdir=" + upper
                     + ",workdir=" + work + options);
     }
+}
+
+/** Covers the machine's files in @p folders, which the overlays show beside the phone's. */
+void mountOwnFolders(const std::vector<std::string> &folders)
+{
+    for (const std::string &folder : folders)
+        mountOn(folder, nullptr, storage + "/layer" + folder, MS_BIND);
 }
 
 /** A /dev without the machine's disks, clock and kernel log. */
@@ -245,6 +254,7 @@ void buildPhone(const std::string &hostName, const PhoneFiles &files)
     mountOn(storage, "tmpfs", "phone", MS_NOSUID | MS_NODEV, "mode=0755");
     writeLayer(files);
     mountOverlays();
+    mountOwnFolders(files.ownFolders);
     mountDevices();
     mountKernelFileSystems();
     mountRun();

@@ -31,6 +31,8 @@ struct PhoneFiles {
     std::map<std::string, std::string> links;
     /** Folders below /etc, /usr or /var that everything in the phone may write to. */
     std::vector<std::string> writableFolders;
+    /** Folders below /etc, /usr or /var in which the phone has its own files and none of the machine's. */
+    std::vector<std::string> ownFolders;
 };
 
 /**

@@ -56,9 +56,10 @@ void Service::disconnect()
     m_connection.reset();
 }
 
-void Service::addObject(const QString &path, const QString &interface, MethodHandlers handlers)
+void Service::addObject(const QString &path, const QString &interface, MethodHandlers handlers,
+                        PropertyReaders properties)
 {
-    m_connection->addObject(path, interface, std::move(handlers));
+    m_connection->addObject(path, interface, std::move(handlers), std::move(properties));
 }
 
 void Service::removeObject(const QString &path, const QString &interface)

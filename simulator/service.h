@@ -32,7 +32,8 @@ public:
     void stop(const Done &done) override;
 
     /** For components while they are attached. */
-    void addObject(const QString &path, const QString &interface, MethodHandlers handlers);
+    void addObject(const QString &path, const QString &interface, MethodHandlers handlers,
+                   PropertyReaders properties = {});
     void removeObject(const QString &path, const QString &interface);
     /** @p handler is given the unique name of each client that leaves the bus. */
     void watchClients(std::function<void(const QString &client)> handler);

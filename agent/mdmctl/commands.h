@@ -5,6 +5,8 @@
 #include "command.h"
 #include "timeouts.h"
 
+#include <QtCore/QJsonObject>
+
 namespace Corvane
 {
 namespace Agent
@@ -17,6 +19,12 @@ Command smsCommand();
 Command dataCommand();
 Command callStatisticsCommand();
 Command simCommand();
+Command packagesCommand();
+Command applicationsCommand();
+Command installCommand();
+Command removeCommand();
+Command wifiCommand();
+Command flightModeCommand();
 Command policyCommand();
 
 // Options that commands share.
@@ -24,6 +32,9 @@ Option jsonOption();
 Option timeoutOption(const QString &meaning);
 
 bool wantsJson(const Values &values);
+
+/** Prints what was asked for in the form that was asked for. */
+void printResult(const Values &values, const QString &text, const QJsonObject &json);
 
 /** The timeouts that hold unless the command line says otherwise. */
 Timeouts timeoutsOf(const Values &values);

@@ -22,6 +22,8 @@ Command program()
     mdmctl.description = QStringLiteral("Examples:\n"
                                         "  mdmctl update status\n"
                                         "  mdmctl calls add dial 244051234567890 block\n"
+                                        "  mdmctl install acme-mail\n"
+                                        "  mdmctl flight-mode on\n"
                                         "  mdmctl policy check company-phone.json\n"
                                         "\n"
                                         "Results go to standard output, as tables or, with --json, as JSON; "
@@ -32,8 +34,10 @@ Command program()
                                         "  1  refused or failed\n"
                                         "  2  wrong usage: nothing was sent\n"
                                         "  3  the service that it takes is not available");
-    mdmctl.commands = {updateCommand(), callsCommand(),          smsCommand(),   dataCommand(),
-                       simCommand(),    callStatisticsCommand(), policyCommand()};
+    mdmctl.commands = {updateCommand(),   callsCommand(),        smsCommand(),        dataCommand(),
+                       simCommand(),      wifiCommand(),         flightModeCommand(), callStatisticsCommand(),
+                       packagesCommand(), applicationsCommand(), installCommand(),    removeCommand(),
+                       policyCommand()};
     mdmctl.commands.append(completionCommand(mdmctl));
     return mdmctl;
 }

@@ -1,6 +1,8 @@
 // SPDX-License-Identifier: LGPL-2.1-or-later
 #include "commands.h"
 
+#include "output.h"
+
 #include <cmath>
 
 namespace Corvane
@@ -38,6 +40,14 @@ Option timeoutOption(const QString &meaning)
 bool wantsJson(const Values &values)
 {
     return values.has(jsonName);
+}
+
+void printResult(const Values &values, const QString &text, const QJsonObject &json)
+{
+    if (wantsJson(values))
+        print(json);
+    else
+        print(text);
 }
 
 Timeouts timeoutsOf(const Values &values)

@@ -39,14 +39,6 @@ QString offerText(const QString &version)
                              : QStringLiteral("Update %1 is available.").arg(version);
 }
 
-void printResult(const Values &values, const QString &text, const QJsonObject &json)
-{
-    if (wantsJson(values))
-        print(json);
-    else
-        print(text);
-}
-
 int printOffer(const SoftwareUpdater &updater, const Values &values)
 {
     const SoftwareUpdater::Offer offer = updater.offer();

@@ -28,21 +28,11 @@ Reply interrupted()
     return {Reply::Interrupted, QStringLiteral("interrupted")};
 }
 
-Setting unanswered(const Setting &setting, const Reply &reply, Setting::Status whenMissing)
-{
-    Setting result = setting.with(Setting::Failed, reply.text);
-    if (reply.outcome == Reply::ServiceLost) {
-        result.serviceMissing = true;
-        result.status = whenMissing;
-    }
-    return result;
-}
-
 QVector<Setting> unanswered(const QVector<Setting> &settings, const Reply &reply)
 {
     QVector<Setting> results;
     for (const Setting &setting : settings)
-        results.append(unanswered(setting, reply, Setting::Unsupported));
+        results.append(setting.unanswered(reply));
     return results;
 }
 
@@ -125,7 +115,7 @@ Setting PolicyEngine::changed(PolicySection *section, const Setting &setting)
     const Reply reply = isInterrupted() ? interrupted() : section->change(setting);
     if (reply.isDone())
         return setting.with(Setting::Changed, setting.detail);
-    return unanswered(setting, reply, Setting::Failed);
+    return setting.unanswered(reply, Setting::Failed);
 }
 
 Reply PolicyEngine::watch(const Policy &policy)
@@ -215,7 +205,7 @@ PolicyEngine::Export PolicyEngine::exportPolicy()
         if (!opened.isDone()) {
             Setting section;
             section.path = entry.section->member();
-            result.missing.append(unanswered(section, opened, Setting::Unsupported));
+            result.missing.append(section.unanswered(opened));
             continue;
         }
         const QJsonObject exported = entry.section->exported();

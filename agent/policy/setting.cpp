@@ -6,6 +6,11 @@ namespace Corvane
 namespace Agent
 {
 
+Setting::Value Setting::Value::onOff(bool on)
+{
+    return {on, on ? QStringLiteral("on") : QStringLiteral("off")};
+}
+
 QString Setting::statusName() const
 {
     switch (status) {
@@ -39,6 +44,23 @@ Setting Setting::with(Status newStatus, const QString &newDetail) const
     Setting setting = *this;
     setting.status = newStatus;
     setting.detail = newDetail;
+    return setting;
+}
+
+Setting Setting::compared() const
+{
+    Setting setting = *this;
+    setting.status = present.json == wanted.json ? Compliant : Different;
+    return setting;
+}
+
+Setting Setting::unanswered(const Reply &reply, Status whenMissing) const
+{
+    Setting setting = with(Failed, reply.text);
+    if (reply.outcome == Reply::ServiceLost) {
+        setting.serviceMissing = true;
+        setting.status = whenMissing;
+    }
     return setting;
 }
 

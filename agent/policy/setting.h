@@ -2,6 +2,8 @@
 #ifndef CORVANE_SETTING_H
 #define CORVANE_SETTING_H
 
+#include "reply.h"
+
 #include <QtCore/QJsonObject>
 #include <QtCore/QJsonValue>
 #include <QtCore/QString>
@@ -25,6 +27,8 @@ struct Setting {
     struct Value {
         QJsonValue json;
         QString text; ///< for people; may have several lines
+
+        static Value onOff(bool on); ///< in JSON true or false
     };
 
     QString path; ///< "calls.dial.default"
@@ -39,6 +43,13 @@ struct Setting {
     QJsonObject toJson() const;
 
     Setting with(Status newStatus, const QString &newDetail) const;
+
+    /** Compliant when the present value is the wanted one, or else different. */
+    Setting compared() const;
+
+    /** What @p reply, which is not done, makes of the setting; @p whenMissing: if the service does not run.
+     */
+    Setting unanswered(const Reply &reply, Status whenMissing = Unsupported) const;
 };
 
 } // namespace Agent

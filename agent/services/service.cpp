@@ -17,9 +17,19 @@ Service Service::telephony()
     return {QStringLiteral("org.ofono"), QStringLiteral("telephony service")};
 }
 
+Service Service::connectionManager()
+{
+    return {QStringLiteral("net.connman"), QStringLiteral("connection manager")};
+}
+
 Service Service::mdmProxy()
 {
     return {QStringLiteral("org.corvaneos.mdmproxy"), QStringLiteral("MDM proxy")};
+}
+
+Service Service::packageKit()
+{
+    return {QStringLiteral("org.freedesktop.PackageKit"), QStringLiteral("package manager")};
 }
 
 QString Service::toString() const
@@ -52,6 +62,11 @@ Reply Service::ensureRunning() const
 Reply Service::notRunning() const
 {
     return {Reply::ServiceLost, toString() + QLatin1String(" is not running")};
+}
+
+QString Service::refusal(const QString &reason) const
+{
+    return QStringLiteral("%1 refused: %2").arg(toString(), reason);
 }
 
 } // namespace Agent

@@ -17,7 +17,9 @@ struct Service {
     QString description; ///< for people
 
     static Service telephony();
+    static Service connectionManager();
     static Service mdmProxy();
+    static Service packageKit();
 
     /** "the telephony service (org.ofono)" */
     QString toString() const;
@@ -33,6 +35,9 @@ struct Service {
 
     /** The answer to everything that is asked of a service that is not there. */
     Reply notRunning() const;
+
+    /** "the telephony service (org.ofono) refused: @p reason" */
+    QString refusal(const QString &reason) const;
 };
 
 } // namespace Agent

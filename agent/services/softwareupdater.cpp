@@ -1,9 +1,9 @@
 // SPDX-License-Identifier: LGPL-2.1-or-later
 #include "softwareupdater.h"
 
+#include "answer.h"
 #include "service.h"
 #include "wait.h"
-#include "warningcapture.h"
 
 namespace Corvane
 {
@@ -35,15 +35,12 @@ SoftwareUpdater::SoftwareUpdater(std::chrono::milliseconds timeout, QObject *par
 SoftwareUpdater::Offer SoftwareUpdater::offer() const
 {
     Offer offer;
-    const WarningCapture failures(QStringLiteral("^Failed to "), [&](const QString &reason) {
-        offer.reply = {Reply::Refused, reason};
+    offer.reply = ask(Service::mdmProxy(), QStringLiteral("^Failed to "), [&] {
+        if (m_updates.softwareUpdateIsAvailable())
+            offer.version = m_updates.latestAvailableUpdateVersion();
     });
-    const bool available = m_updates.softwareUpdateIsAvailable();
-    if (offer.reply.isDone() && available)
-        offer.version = m_updates.latestAvailableUpdateVersion();
-    // A service that died under the question explains the failure better than the bus does.
-    if (!offer.reply.isDone() && !Service::mdmProxy().isRunning())
-        offer.reply = Service::mdmProxy().notRunning();
+    if (!offer.reply.isDone())
+        offer.version.clear();
     return offer;
 }
 

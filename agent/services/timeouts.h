@@ -12,7 +12,8 @@ namespace Agent
 /** How long services are waited for. */
 struct Timeouts {
     std::chrono::milliseconds confirmation{std::chrono::seconds(25)}; ///< of a setting
-    std::chrono::milliseconds silence{std::chrono::minutes(5)}; ///< during a software update
+    std::chrono::milliseconds silence{
+        std::chrono::minutes(5)}; ///< during a software update, and for a package
 };
 
 } // namespace Agent

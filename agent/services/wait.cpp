@@ -13,7 +13,8 @@ namespace Agent
 namespace
 {
 
-const QLatin1String refusals(R"(^Method call failed: |GetAll\(\) failed: |^search\(\) failed: )");
+const QLatin1String refusals(
+    R"(^Method call failed: |GetAll\(\) failed: |^search\(\) failed: |^The connection manager refused )");
 
 QString seconds(std::chrono::milliseconds time)
 {
@@ -25,9 +26,7 @@ QString seconds(std::chrono::milliseconds time)
 Wait::Wait(const Service &service, std::chrono::milliseconds time, const QString &awaited)
     : m_service(service)
     , m_watcher(service.name, QDBusConnection::systemBus(), QDBusServiceWatcher::WatchForUnregistration)
-    , m_refusals(refusals, [this](const QString &reason) {
-        end(Reply::Refused, QStringLiteral("%1 refused: %2").arg(m_service.toString(), reason));
-    })
+    , m_refusals(refusals, [this](const QString &reason) { end(Reply::Refused, m_service.refusal(reason)); })
 {
     connect(&m_watcher, &QDBusServiceWatcher::serviceUnregistered, this,
             [this] { end(Reply::ServiceLost, m_service.notRunning().text); });

@@ -82,9 +82,10 @@ void WarningCapture::handle(QtMsgType type, const QMessageLogContext &, const QS
 
 bool WarningCapture::take(const QString &message) const
 {
-    if (!m_pattern.match(message).hasMatch())
+    const QRegularExpressionMatch match = m_pattern.match(message);
+    if (!match.hasMatch())
         return false;
-    m_taker(reasonOf(message));
+    m_taker(match.lastCapturedIndex() > 0 ? match.captured(1) : reasonOf(message));
     return true;
 }
 

@@ -21,7 +21,10 @@ namespace Agent
 class WarningCapture
 {
 public:
-    /** @param taker gets the reason of a warning that matches @p pattern, see reasonOf(). */
+    /**
+     * @param taker gets what a group of @p pattern captures in a warning that matches, or without groups the
+     * reason of the warning, see reasonOf().
+     */
     WarningCapture(const QString &pattern, std::function<void(const QString &)> taker);
     ~WarningCapture();
     Q_DISABLE_COPY(WarningCapture)

@@ -2,16 +2,17 @@
 #include "component.h"
 #include "mdmproxy.h"
 #include "refusal.h"
+#include "sandbox.h"
 #include "service.h"
 #include "timer.h"
 
 #include <QtCore/QDateTime>
+#include <QtCore/QFile>
 #include <QtCore/QJsonArray>
 
 #include <algorithm>
 #include <array>
 #include <cmath>
-#include <optional>
 #include <set>
 
 namespace Corvane
@@ -24,6 +25,10 @@ namespace
 
 const QLatin1String objectPath("/Corvane/Mdm/Proxy/LocationInfo");
 const QLatin1String interfaceName("org.corvaneos.mdmproxy.locationinfo");
+
+constexpr char settingsFile[] = "/etc/location/location.conf";
+constexpr char settingsGroup[] = "location";
+const QLatin1String receiverDevice("/dev/gnss0");
 
 constexpr double degreesToRadians = 3.14159265358979323846 / 180;
 constexpr double earthRadius = 6371008.8; // m
@@ -97,6 +102,17 @@ private:
     double m_length = 0; // m, one way
 };
 
+/** Whether the settings let the receiver run. */
+bool isAllowed()
+{
+    const std::unique_ptr<GKeyFile, GlibDeleter<g_key_file_unref>> settings(g_key_file_new());
+    g_key_file_load_from_file(settings.get(), settingsFile, G_KEY_FILE_NONE, nullptr);
+    const auto isSet = [&settings](const char *key) {
+        return g_key_file_get_boolean(settings.get(), settingsGroup, key, nullptr) != FALSE;
+    };
+    return isSet("enabled") && isSet("gps_enabled") && !isSet("gps_flight_mode");
+}
+
 /** What a receiver sees that has made @p reports reports since it was started: it finds more and more. */
 Satellites satellitesAfter(int reports, int reportsToFix)
 {
@@ -157,6 +173,9 @@ Location::Location(const QJsonObject &profile)
     , m_place(m_track.after(0))
     , m_time(QDateTime::currentDateTimeUtc())
 {
+    // As the kernel shows one; nothing reads it.
+    if (profile.value(QLatin1String("receiver")).toBool())
+        QFile(receiverDevice).open(QIODevice::WriteOnly);
 }
 
 void Location::attach(Service &service)
@@ -226,8 +245,13 @@ void Location::scheduleReport()
 
 void Location::report()
 {
-    ++m_reports;
     m_way += m_speed * m_interval / 1000;
+    if (!isAllowed()) {
+        m_reports = 0;
+        m_satellites = {};
+        return;
+    }
+    ++m_reports;
     m_satellites = m_hasSignal ? satellitesAfter(m_reports, m_reportsToFix) : Satellites();
     m_service->emitSignal(objectPath, interfaceName, QStringLiteral("satellitesChanged"),
                           g_variant_new("(ii)", m_satellites.inUse, m_satellites.inView));
@@ -296,6 +320,19 @@ std::vector<Action> Location::actions()
     };
 }
 
+void addFiles(const QJsonObject &profile, PhoneFiles &files)
+{
+    const QJsonObject settings
+        = profile.value(QLatin1String("location")).toObject().value(QLatin1String("settings")).toObject();
+    std::string content = std::string("[") + settingsGroup + "]\n";
+    for (auto setting = settings.begin(); setting != settings.end(); ++setting) {
+        const QVariant value = setting.value().isBool() ? setting.value().toVariant()
+                                                        : QVariant(qint64(setting.value().toDouble()));
+        content += setting.key().toStdString() + '=' + value.toString().toStdString() + '\n';
+    }
+    files.files[settingsFile] = content;
+}
+
 QString problemOf(const QJsonObject &)
 {
     return QString();
@@ -307,6 +344,7 @@ const ComponentRegistration registration({
         return std::make_unique<Location>(profile.value(QLatin1String("location")).toObject());
     },
     problemOf,
+    addFiles,
 });
 
 } // namespace

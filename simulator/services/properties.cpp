@@ -1,6 +1,8 @@
 // SPDX-License-Identifier: LGPL-2.1-or-later
 #include "properties.h"
 
+#include "service.h"
+
 #include <algorithm>
 
 namespace Corvane
@@ -51,6 +53,21 @@ void PropertyChanges::take(const Properties &now,
         });
         if (!isTold)
             announce(property.first, property.second.get());
+    }
+}
+
+void announceChanges(const Service &service, const QString &path, const QString &interface,
+                     PropertyChanges *told, const Properties &now)
+{
+    Properties changed;
+    told->take(now, [&changed](const QString &name, GVariant *value) {
+        changed.emplace_back(name, Variant::shared(value));
+    });
+    if (!changed.empty()) {
+        service.emitSignal(path, QStringLiteral("org.freedesktop.DBus.Properties"),
+                           QStringLiteral("PropertiesChanged"),
+                           g_variant_new("(s@a{sv}@as)", interface.toUtf8().constData(), toVariant(changed),
+                                         g_variant_new_strv(nullptr, 0)));
     }
 }
 

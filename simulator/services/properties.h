@@ -16,6 +16,8 @@ namespace Corvane
 namespace Simulator
 {
 
+class Service;
+
 /** The properties of an object in the telephony daemon's way, in the order in which changes are announced. */
 using Properties = std::vector<std::pair<QString, Variant>>;
 
@@ -40,6 +42,10 @@ public:
 private:
     Properties m_told;
 };
+
+/** Announces what has changed of an object's properties in D-Bus's own way, if anything has. */
+void announceChanges(const Service &service, const QString &path, const QString &interface,
+                     PropertyChanges *told, const Properties &now);
 
 } // namespace Simulator
 } // namespace Corvane

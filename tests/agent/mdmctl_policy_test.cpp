@@ -40,6 +40,16 @@ QStringList withoutQueries(QStringList calls)
     return calls;
 }
 
+/** The members of a policy, as they stand in a message. */
+QString members()
+{
+    QFile schema(QStringLiteral(POLICY_SCHEMA));
+    if (!schema.open(QIODevice::ReadOnly))
+        qFatal("cannot read the schema");
+    const QStringList names = json(schema.readAll()).value(QLatin1String("properties")).toObject().keys();
+    return names.join(QStringLiteral("\", \""));
+}
+
 QString statuses(const QJsonObject &report)
 {
     QStringList texts;
@@ -256,8 +266,7 @@ void MdmctlPolicyTest::wrongPolicyIsRefusedWithThePath_data()
     QTest::newRow("syntax") << QByteArray("{\n\"calls\": ,}") << R"(FILE:2:10: illegal value)";
     QTest::newRow("unknown family")
         << QByteArray(R"({"call": {}})")
-        << R"(FILE: /call: unknown member; must be one of "$schema", "calls", "data", )"
-           R"("description", "name", "sms", "softwareUpdate")";
+        << QStringLiteral("FILE: /call: unknown member; must be one of \"%1\"").arg(members());
     QTest::newRow("unknown member")
         << QByteArray(R"({"calls": {"dail": {}}})")
         << R"(FILE: /calls/dail: unknown member; must be one of "dial", "incoming")";
@@ -498,14 +507,16 @@ void MdmctlPolicyTest::exportIsWhatCheckAccepts()
     const Mdmctl::Result exported = Mdmctl::run({QStringLiteral("policy"), QStringLiteral("export")});
     QCOMPARE(exported.errors, QString());
     QCOMPARE(exported.status, 0);
-    QJsonObject policy = exported.json();
-    QVERIFY(policy.take(QStringLiteral("name")).toString().startsWith(QStringLiteral("Exported from ")));
-    QCOMPARE(policy,
-             json(R"({"calls": {"dial": {"default": "allow", "rules": [{"imsi": "1", "action": "block"}]},
-                                        "incoming": {"default": "hangup", "rules": []}},
-                              "sms": {"default": "allow", "rules": []},
-                              "data": {"default": "allow", "rules": []},
-                              "softwareUpdate": {"install": "latest"}})"));
+    const QJsonObject policy = exported.json();
+    QVERIFY(policy.value(QLatin1String("name")).toString().startsWith(QStringLiteral("Exported from ")));
+    const QJsonObject expected
+        = json(R"({"calls": {"dial": {"default": "allow", "rules": [{"imsi": "1", "action": "block"}]},
+                             "incoming": {"default": "hangup", "rules": []}},
+                   "sms": {"default": "allow", "rules": []},
+                   "data": {"default": "allow", "rules": []},
+                   "softwareUpdate": {"install": "latest"}})");
+    for (auto section = expected.begin(); section != expected.end(); ++section)
+        QCOMPARE(policy.value(section.key()), *section);
     QCOMPARE(run(QStringLiteral("check"), exported.output.toUtf8()).status, 0);
     call(Dial, QStringLiteral("ClearRules"));
     QCOMPARE(run(QStringLiteral("check"), exported.output.toUtf8()).status, 1);
@@ -524,14 +535,11 @@ void MdmctlPolicyTest::exportWithoutAService()
 {
     m_phone.stopService(Ofono);
     const Mdmctl::Result exported = Mdmctl::run({QStringLiteral("policy"), QStringLiteral("export")});
-    QCOMPARE(exported.errors, [] {
-        QString errors;
-        for (const char *section : {"calls", "sms", "data"})
-            errors += QStringLiteral(
-                          "mdmctl: \"%1\" is left out: the telephony service (org.ofono) is not running\n")
-                          .arg(QLatin1String(section));
-        return errors;
-    }());
+    const QStringList errors = exported.errors.split(QLatin1Char('\n'), Qt::SkipEmptyParts);
+    const QString error
+        = QStringLiteral("mdmctl: \"%1\" is left out: the telephony service (org.ofono) is not running");
+    for (const char *section : {"calls", "sms", "data"})
+        QVERIFY2(errors.contains(error.arg(QLatin1String(section))), qPrintable(exported.errors));
     QVERIFY(exported.json().contains(QStringLiteral("softwareUpdate")));
     QCOMPARE(exported.status, 3);
 }

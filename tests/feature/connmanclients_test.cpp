@@ -3,42 +3,18 @@
 #include "phone.h"
 #include "signalsequence.h"
 #include "waiting.h"
+#include "wireobject.h"
 
 #include <connman/networkmanager.h>
 #include <connman/networkservice.h>
 #include <connman/networktechnology.h>
 
 #include <QtCore/QThread>
-#include <QtDBus/QDBusArgument>
-#include <QtDBus/QDBusMetaType>
 #include <QtDBus/QDBusObjectPath>
 #include <QtDBus/QDBusVariant>
 #include <QtTest/QtTest>
 
 #include <memory>
-
-/** An entry of a list of networks on the wire. */
-struct WireObject {
-    QDBusObjectPath path;
-    QVariantMap properties;
-};
-Q_DECLARE_METATYPE(WireObject)
-
-QDBusArgument &operator<<(QDBusArgument &out, const WireObject &object)
-{
-    out.beginStructure();
-    out << object.path << object.properties;
-    out.endStructure();
-    return out;
-}
-
-const QDBusArgument &operator>>(const QDBusArgument &in, WireObject &object)
-{
-    in.beginStructure();
-    in >> object.path >> object.properties;
-    in.endStructure();
-    return in;
-}
 
 namespace
 {
@@ -83,10 +59,7 @@ QStringList names(const QVector<NetworkTechnology *> &technologies)
 /** The networks as "ServicesChanged" and "GetServices" have them. */
 QVariant wireList(const QVector<std::pair<QString, QVariantMap>> &services)
 {
-    QList<WireObject> wire;
-    for (const auto &[identifier, properties] : services)
-        wire.append({QDBusObjectPath(Prefix + identifier), properties});
-    return QVariant::fromValue(wire);
+    return WireObject::list(Prefix, services);
 }
 
 } // namespace
@@ -146,8 +119,7 @@ private:
 
 void ConnManClientsTest::initTestCase()
 {
-    qDBusRegisterMetaType<WireObject>();
-    qDBusRegisterMetaType<QList<WireObject>>();
+    WireObject::registerTypes();
     m_phone = std::make_unique<Phone>();
 }
 
@@ -411,9 +383,8 @@ void ConnManClientsTest::servicesKeepTheConnectionManagersOrder()
 {
     const NetworkManager *manager = validManager();
     const NetworkService *office = saved(Office);
-    m_phone->emitSignal(
-        Service, Root, ManagerInterface, QStringLiteral("ServicesChanged"),
-        {wireList({{Home, {}}, {Office, {}}, {Home, {}}}), QVariant::fromValue(QList<QDBusObjectPath>())});
+    m_phone->emitSignal(Service, Root, ManagerInterface, QStringLiteral("ServicesChanged"),
+                        {wireList({{Home, {}}, {Office, {}}, {Home, {}}}), WireObject::paths({})});
     QCOMPARE(names(manager->getSavedServices(QStringLiteral("wifi"))), list("Home|Corvane Office"));
     QCOMPARE(saved(Office), office);
 }
@@ -526,8 +497,7 @@ void ConnManClientsTest::loadsWhatTheListLeavesOut()
         Service, Root, ManagerInterface, QStringLiteral("ServicesChanged"),
         {wireList({}), QVariant::fromValue(QList<QDBusObjectPath>{QDBusObjectPath(Prefix + Cafe)})});
     m_phone->emitSignal(Service, Root, ManagerInterface, QStringLiteral("ServicesChanged"),
-                        {wireList({{Cafe, {{QStringLiteral("Favorite"), true}}}}),
-                         QVariant::fromValue(QList<QDBusObjectPath>())});
+                        {wireList({{Cafe, {{QStringLiteral("Favorite"), true}}}}), WireObject::paths({})});
     NetworkService *cafe = saved(Cafe);
     QVERIFY(cafe);
     QCOMPARE(cafe->name(), QString());
@@ -536,7 +506,7 @@ void ConnManClientsTest::loadsWhatTheListLeavesOut()
     // The next list finds it still unknown, and this time there is an answer.
     m_phone->clearFaults();
     m_phone->emitSignal(Service, Root, ManagerInterface, QStringLiteral("ServicesChanged"),
-                        {wireList({{Cafe, {}}}), QVariant::fromValue(QList<QDBusObjectPath>())});
+                        {wireList({{Cafe, {}}}), WireObject::paths({})});
     QVERIFY(seen.waitFor(2));
     QCOMPARE(seen.take(), list("proxyConfigChanged({})|propertiesReady()"));
     QCOMPARE(cafe->name(), QStringLiteral("Station Cafe"));
@@ -577,7 +547,7 @@ void ConnManClientsTest::followsAPath()
     m_phone->emitSignal(
         Service, Root, ManagerInterface, QStringLiteral("ServicesChanged"),
         {wireList({{QStringLiteral("wifi_nowhere"), {{QStringLiteral("Name"), QStringLiteral("Nowhere")}}}}),
-         QVariant::fromValue(QList<QDBusObjectPath>())});
+         WireObject::paths({})});
     QCOMPARE(seen.take(), list("propertiesReady()"));
     QCOMPARE(follower.name(), QStringLiteral("Nowhere"));
     m_phone->emitSignal(Service, Root, ManagerInterface, QStringLiteral("ServicesChanged"),

@@ -5,12 +5,16 @@
 
 #include <corvanemdm/callstatistics.h>
 #include <corvanemdm/certificates.h>
+#include <corvanemdm/networkdatacounter.h>
 #include <corvanemdm/simfilter.h>
 #include <corvanemdm/siminfo.h>
+
+#include <QtCore/QUrl>
 
 using Corvane::Mdm::CallStatistics;
 using Corvane::Mdm::CertificateFile;
 using Corvane::Mdm::Certificates;
+using Corvane::Mdm::NetworkDataCounter;
 using Corvane::Mdm::SimFilter;
 using Corvane::Mdm::SimInfo;
 
@@ -26,6 +30,21 @@ QString text(const SimFilter::Rule &rule)
 QString text(const CallStatistics::Result &result)
 {
     return result.time.toString(Qt::ISODate) + QLatin1Char('=') + QString::number(result.value);
+}
+
+QString text(const NetworkDataCounter::Update &update)
+{
+    static const char *const types[] = {"home", "roaming", "wlan"};
+    return QStringLiteral("%1 %2 tx:%3 rx:%4 time:%5")
+        .arg(update.identifier, QLatin1String(types[update.type]))
+        .arg(update.txBytes)
+        .arg(update.rxBytes)
+        .arg(update.time);
+}
+
+QString text(const QUrl &url)
+{
+    return url.toString();
 }
 
 template <typename T> QString text(const QList<T> &list)
@@ -69,6 +88,10 @@ QString text(int type, const void *value)
         return static_cast<const CertificateFile *>(value)->fileName();
     if (type == qMetaTypeId<Certificates::Result>())
         return QString::number(*static_cast<const Certificates::Result *>(value));
+    if (type == qMetaTypeId<NetworkDataCounter::Update>())
+        return text(*static_cast<const NetworkDataCounter::Update *>(value));
+    if (type == qMetaTypeId<QList<QUrl>>())
+        return text(*static_cast<const QList<QUrl> *>(value));
     if (type == QMetaType::UnknownType)
         return QStringLiteral("<type unknown to the meta-object system>");
     return text(QVariant(type, value));

@@ -16,7 +16,8 @@ QString simStateText(const Corvane::Mdm::SimInfo::SimState &state);
  * Records every signal that the classes of an object declare, in the order of emission and with its
  * arguments, as "name(argument, argument)". Rules read "244:block", lists of rules "[244:block 262:allow]",
  * results of call statistics "2026-03-01T00:00:00Z=3", SIM states as simStateText() writes them, maps
- * "{Method=auto URL=http://example}".
+ * "{Method=auto URL=http://example}", URLs "[http://a http://b]", reports on data "wifi_1 wlan tx:1 rx:2
+ * time:3".
  *
  * Connects through the meta-object alone, as a binding to another language would.
  */

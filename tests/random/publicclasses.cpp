@@ -14,31 +14,21 @@
 #include <corvanemdm/simvoicecallfilter.h>
 #include <corvanemdm/softwareupdate.h>
 
-#if __has_include(<corvanemdm/netproxy.h>)
-#include <corvanemdm/netproxy.h>
-#endif
-#if __has_include(<corvanemdm/networkdatacounter.h>)
-#include <corvanemdm/networkdatacounter.h>
-#endif
 #include <corvanemdm/autostart.h>
 #include <corvanemdm/certificates.h>
 #include <corvanemdm/emailaccountprovisioner.h>
 #include <corvanemdm/genericaccountprovisioner.h>
+#include <corvanemdm/netproxy.h>
+#include <corvanemdm/networkdatacounter.h>
 #if __has_include(<corvanemdm/devicelock.h>)
 #include <corvanemdm/devicelock.h>
 #endif
 #if __has_include(<corvanemdm/securitysettings.h>)
 #include <corvanemdm/securitysettings.h>
 #endif
-#if __has_include(<corvanemdm/datetimesettings.h>)
-#include <corvanemdm/datetimesettings.h>
-#endif
-#if __has_include(<corvanemdm/locationsettings.h>)
-#include <corvanemdm/locationsettings.h>
-#endif
-#if __has_include(<corvanemdm/batteryinfo.h>)
 #include <corvanemdm/batteryinfo.h>
-#endif
+#include <corvanemdm/datetimesettings.h>
+#include <corvanemdm/locationsettings.h>
 
 using namespace Corvane::Mdm;
 
@@ -205,7 +195,6 @@ TestedClass connectivitySettings()
     return tested;
 }
 
-#if __has_include(<corvanemdm/netproxy.h>)
 TestedClass netProxy()
 {
     using Tested = NetProxy;
@@ -213,15 +202,12 @@ TestedClass netProxy()
         "NetProxy",
         {CALL(selectProxy), CALL(getIdentifier), CALL(getName), CALL(getIdentifiers), CALL(getTechnologies)});
 }
-#endif
 
-#if __has_include(<corvanemdm/networkdatacounter.h>)
 TestedClass networkDataCounter()
 {
     using Tested = NetworkDataCounter;
     return testedClass<Tested>("NetworkDataCounter", {CALL(setActive), CALL(resetCounter)});
 }
-#endif
 
 TestedClass emailAccountProvisioner()
 {
@@ -281,15 +267,12 @@ TestedClass securitySettings()
 }
 #endif
 
-#if __has_include(<corvanemdm/datetimesettings.h>)
 TestedClass dateTimeSettings()
 {
     using Tested = DateTimeSettings;
     return testedClass<Tested>("DateTimeSettings", {CALL(setTime), CALL(setDate), CALL(supportedTimeZones)});
 }
-#endif
 
-#if __has_include(<corvanemdm/locationsettings.h>)
 TestedClass locationSettings()
 {
     using Tested = LocationSettings;
@@ -303,14 +286,11 @@ TestedClass locationSettings()
     };
     return tested;
 }
-#endif
 
-#if __has_include(<corvanemdm/batteryinfo.h>)
 TestedClass batteryInfo()
 {
     return testedClass<BatteryInfo>("BatteryInfo", {});
 }
-#endif
 
 } // namespace
 
@@ -320,29 +300,16 @@ const std::vector<TestedClass> &testedClasses()
     {
         simInfo(), simVoiceCallFilter(), simSmsFilter(), simMobileDataFilter(),
             testedClass<SimFilter>("SimFilter", {}), callStatistics(), notificationInfo(), softwareUpdate(),
-            locationInfo(), connectivitySettings(), applications(), applicationOperation(),
-#if __has_include(<corvanemdm/netproxy.h>)
-            netProxy(),
-#endif
-#if __has_include(<corvanemdm/networkdatacounter.h>)
-            networkDataCounter(),
-#endif
-            emailAccountProvisioner(), genericAccountProvisioner(), autostart(), certificates(),
+            locationInfo(), connectivitySettings(), applications(), applicationOperation(), netProxy(),
+            networkDataCounter(), emailAccountProvisioner(), genericAccountProvisioner(), autostart(),
+            certificates(),
 #if __has_include(<corvanemdm/devicelock.h>)
             deviceLock(),
 #endif
 #if __has_include(<corvanemdm/securitysettings.h>)
             securitySettings(),
 #endif
-#if __has_include(<corvanemdm/datetimesettings.h>)
-            dateTimeSettings(),
-#endif
-#if __has_include(<corvanemdm/locationsettings.h>)
-            locationSettings(),
-#endif
-#if __has_include(<corvanemdm/batteryinfo.h>)
-            batteryInfo(),
-#endif
+            dateTimeSettings(), locationSettings(), batteryInfo(),
     };
     return classes;
 }

@@ -1,4 +1,5 @@
 // SPDX-License-Identifier: LGPL-2.1-or-later
+#include <packagesection.h>
 #include <policy.h>
 #include <softwareupdatesection.h>
 #include <warningcapture.h>
@@ -17,6 +18,8 @@ private Q_SLOTS:
     void schemaAndSectionsNameTheSameMembers();
     void settingsComeFromThePolicyAlone();
     void repeatedRuleIsAFault();
+    void packageAgainstTheInstalledOne_data();
+    void packageAgainstTheInstalledOne();
     void updateAgainstTheOffer_data();
     void updateAgainstTheOffer();
     void reasonOfAWarning();
@@ -75,6 +78,50 @@ void PolicySectionsTest::repeatedRuleIsAFault()
     QCOMPARE(
         policy.error,
         QStringLiteral(R"(FILE: /calls/incoming/rules/2/imsi: must be named once; "1" has a rule already)"));
+}
+
+void PolicySectionsTest::packageAgainstTheInstalledOne_data()
+{
+    QTest::addColumn<QJsonValue>("wanted");
+    QTest::addColumn<QString>("installed");
+    QTest::addColumn<QString>("detail");
+    const QJsonValue required(true);
+    const QJsonValue forbidden(false);
+    const QJsonValue pinned(QStringLiteral("1.2-3"));
+    QTest::newRow("required, there") << required << "1.0"
+                                     << "";
+    QTest::newRow("required, missing") << required << ""
+                                       << "install the newest version";
+    QTest::newRow("forbidden, there") << forbidden << "1.0"
+                                      << "remove it";
+    QTest::newRow("forbidden, missing") << forbidden << ""
+                                        << "";
+    QTest::newRow("pinned, there") << pinned << "1.2"
+                                   << "";
+    QTest::newRow("pinned, there with a release") << pinned << "1.2-3"
+                                                  << "";
+    QTest::newRow("pinned, missing") << pinned << ""
+                                     << "install 1.2-3";
+    QTest::newRow("pinned, older") << pinned << "1.1"
+                                   << "install 1.2-3";
+    QTest::newRow("pinned, shorter") << pinned << "1"
+                                     << "install 1.2-3";
+    QTest::newRow("pinned, longer") << pinned << "1.20"
+                                    << "install 1.2-3";
+}
+
+void PolicySectionsTest::packageAgainstTheInstalledOne()
+{
+    QFETCH(QJsonValue, wanted);
+    QFETCH(QString, installed);
+    QFETCH(QString, detail);
+    Setting setting;
+    setting.wanted.json = wanted;
+    setting = PackageSection::compared(setting, installed);
+    QCOMPARE(setting.detail, detail);
+    QCOMPARE(setting.status, detail.isEmpty() ? Setting::Compliant : Setting::Different);
+    QCOMPARE(setting.present.text, installed.isEmpty() ? QStringLiteral("not installed") : installed);
+    QCOMPARE(setting.present.json.isNull(), installed.isEmpty());
 }
 
 void PolicySectionsTest::updateAgainstTheOffer_data()

@@ -2,13 +2,18 @@
 // Uses every public class from outside of the project. Where no service answers, it must work as well.
 #include <corvanemdm/applications.h>
 #include <corvanemdm/autostart.h>
+#include <corvanemdm/batteryinfo.h>
 #include <corvanemdm/callstatistics.h>
 #include <corvanemdm/certificates.h>
 #include <corvanemdm/connectivitysettings.h>
 #include <corvanemdm/corvanemdm_global.h>
+#include <corvanemdm/datetimesettings.h>
 #include <corvanemdm/emailaccountprovisioner.h>
 #include <corvanemdm/genericaccountprovisioner.h>
 #include <corvanemdm/locationinfo.h>
+#include <corvanemdm/locationsettings.h>
+#include <corvanemdm/netproxy.h>
+#include <corvanemdm/networkdatacounter.h>
 #include <corvanemdm/notificationinfo.h>
 #include <corvanemdm/provisioner.h>
 #include <corvanemdm/simfilter.h>
@@ -23,6 +28,7 @@
 #include <QtCore/QTextStream>
 
 #include <algorithm>
+#include <iterator>
 
 using namespace Corvane::Mdm;
 
@@ -152,6 +158,51 @@ bool locationInfoWorks()
     return info.satellitesInUse() == -1 && !position.timestamp.isValid() && position.latitude == 0.0;
 }
 
+bool netProxyWorks()
+{
+    NetProxy proxy;
+    QObject::connect(&proxy, &NetProxy::validChanged, &proxy, [](bool) {});
+    // Nothing is selected before the event loop has run.
+    return !proxy.isValid() && proxy.type() == NetProxy::Invalid && !proxy.setType(NetProxy::Direct)
+        && proxy.getIdentifiers(QStringLiteral("global")) == QStringList(QStringLiteral("global"));
+}
+
+bool networkDataCounterWorks()
+{
+    NetworkDataCounter counter;
+    int updates = 0;
+    QObject::connect(&counter, &NetworkDataCounter::counterUpdate, &counter,
+                     [&updates](const NetworkDataCounter::Update &) { ++updates; });
+    counter.setUpdateInterval(5);
+    return !counter.active() && counter.updateInterval() == 5 && updates == 0;
+}
+
+bool locationSettingsWork()
+{
+    const LocationSettings settings;
+    QObject::connect(&settings, &LocationSettings::locationEnabledChanged, &settings, [] {});
+    const LocationSettings::DataSources satellites = LocationSettings::GpsData | LocationSettings::SbasData;
+    return satellites.testFlag(LocationSettings::GpsData)
+        && settings.availableAgpsProviders().contains(QStringLiteral("here"))
+        == settings.agpsAvailable(QStringLiteral("here"));
+}
+
+bool dateTimeSettingsWork()
+{
+    DateTimeSettings settings;
+    QObject::connect(&settings, &DateTimeSettings::timeZoneChanged, &settings, [] {});
+    // Nothing is known before the event loop has run.
+    return !settings.ready() && settings.timeZone().isEmpty()
+        && settings.supportedTimeZones().contains(QStringLiteral("Europe/Helsinki"));
+}
+
+bool batteryInfoWorks()
+{
+    const BatteryInfo battery;
+    QObject::connect(&battery, &BatteryInfo::chargePercentageChanged, &battery, [](int) {});
+    return battery.chargePercentage() == -1 && battery.status() == BatteryInfo::BatteryStatusUnknown;
+}
+
 QString latestVersion()
 {
     const SoftwareUpdate update;
@@ -165,18 +216,15 @@ QString latestVersion()
 int main(int argc, char **argv)
 {
     QCoreApplication application(argc, argv);
-    bool works = simFilterWorks();
-    works = provisionersWork() && works;
-    works = autostartWorks() && works;
-    works = certificatesWork() && works;
-    works = applicationsWork() && works;
-    works = simVoiceCallFilterWorks() && works;
-    works = otherFiltersWork() && works;
-    works = simInfoWorks() && works;
-    works = callStatisticsWork() && works;
-    works = notificationInfoWorks() && works;
-    works = locationInfoWorks() && works;
-    works = connectivitySettingsWork() && works;
+    bool (*const checks[])() = {
+        simFilterWorks,          simInfoWorks,         connectivitySettingsWork, simVoiceCallFilterWorks,
+        otherFiltersWork,        callStatisticsWork,   applicationsWork,         notificationInfoWorks,
+        locationInfoWorks,       locationSettingsWork, dateTimeSettingsWork,     batteryInfoWorks,
+        provisionersWork,        autostartWorks,       certificatesWork,         netProxyWorks,
+        networkDataCounterWorks,
+    };
+    const bool works
+        = std::all_of(std::begin(checks), std::end(checks), [](bool (*check)()) { return check(); });
     QTextStream(stdout) << (works ? "consumer works" : "consumer fails") << ", update: " << latestVersion()
                         << '\n';
     return works ? 0 : 1;
