@@ -50,14 +50,14 @@ class CORVANEMDM_EXPORT LocationSettings : public QObject
 
 public:
     /** When the settings are known. */
-    enum Mode {
+    enum Mode : int {
         AsynchronousMode = 0, ///< once the event loop runs; the change signals tell
         SynchronousMode = 1 ///< when the object is made
     };
     Q_ENUM(Mode)
 
     /** What the phone chooses its sources by. */
-    enum LocationMode {
+    enum LocationMode : int {
         HighAccuracyMode = 0, ///< all that help
         BatterySavingMode = 1, ///< no satellites
         DeviceOnlyMode = 2, ///< nothing from the network

@@ -26,7 +26,12 @@ public:
     Q_ENUM(Mode)
 
     /** Which of the sources are used; "mode". */
-    enum LocationMode { HighAccuracyMode = 0, BatterySavingMode = 1, DeviceOnlyMode = 2, CustomMode = 3 };
+    enum LocationMode : int {
+        HighAccuracyMode = 0,
+        BatterySavingMode = 1,
+        DeviceOnlyMode = 2,
+        CustomMode = 3
+    };
     Q_ENUM(LocationMode)
 
     /** How a provider of assistance data stands; "here_state", "mls_online_state". */
