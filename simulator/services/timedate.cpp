@@ -107,7 +107,7 @@ MethodHandlers TimeDate::methods()
              const QList<QByteArray> ids = QTimeZone::availableTimeZoneIds();
              for (const QByteArray &id : ids)
                  zones << QString::fromUtf8(id);
-             call.reply(g_variant_new("(@as)", g_variant_ref(fromList(zones).get())));
+             call.reply(g_variant_new("(@as)", fromList(zones).get()));
          }},
     };
 }
