@@ -549,8 +549,12 @@ QStringList ConnectivitySettings::modemPaths() const
 
 QString ConnectivitySettings::modemSimImsi(const QString &modemPath) const
 {
-    QDBusInterface sim(OfonoService, modemPath, SimManagerInterface, QDBusConnection::systemBus());
-    const QVariantMap properties = readProperties(&sim);
+    QVariantMap properties;
+    // A text that is no path ends the program in the D-Bus library.
+    if (!QDBusObjectPath(modemPath).path().isEmpty()) {
+        QDBusInterface sim(OfonoService, modemPath, SimManagerInterface, QDBusConnection::systemBus());
+        properties = readProperties(&sim);
+    }
     if (!properties.contains(SubscriberIdentityProperty))
         qWarning() << "Subscriber Identity property not returned for SIM:" << modemPath;
     return properties.value(SubscriberIdentityProperty).toString();
