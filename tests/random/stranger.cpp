@@ -31,6 +31,7 @@ const char socketPath[] = "/run/veld-devicelock/socket";
 
 /** Whose client library, which is the distribution's, does not survive signals of other types. */
 const char trustedService[] = "org.freedesktop.PackageKit";
+const char trustedPath[] = "/org/freedesktop/PackageKit";
 
 constexpr std::size_t rememberedMessages = 12;
 constexpr guint longestHold = 20; // milliseconds; a client that blocks waits no longer
@@ -485,9 +486,9 @@ void Stranger::sendSignal(Random &random)
         member = chosen->name;
         signature = signatureOf(chosen->args);
     }
-    if (random.chance(15) && offer.service != trustedService)
-        signature = ValueGenerator::signature(random, 4);
     const QByteArray path = random.chance(5) ? m_record->values().objectPath(random) : offer.path;
+    if (random.chance(15) && offer.service != trustedService && !path.startsWith(trustedPath))
+        signature = ValueGenerator::signature(random, 4);
     const Pointer<GDBusMessage> signal(
         g_dbus_message_new_signal(path.constData(), name.constData(), member.constData()));
     GDBusConnection *connection = m_bus.get();
