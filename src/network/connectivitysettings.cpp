@@ -6,6 +6,7 @@
 #include "platform/frame/signalconnection_p.h"
 
 #include <QtCore/QDebug>
+#include <QtCore/QRegularExpression>
 #include <QtDBus/QDBusConnection>
 #include <QtDBus/QDBusReply>
 
@@ -550,8 +551,9 @@ QStringList ConnectivitySettings::modemPaths() const
 QString ConnectivitySettings::modemSimImsi(const QString &modemPath) const
 {
     QVariantMap properties;
-    // A text that is no path ends the program in the D-Bus library.
-    if (!QDBusObjectPath(modemPath).path().isEmpty()) {
+    // The first question to an interface is for its description, and ends the program without a path.
+    static const QRegularExpression path(QStringLiteral("\\A/(?:\\w+(?:/\\w+)*)?\\z"));
+    if (path.match(modemPath).hasMatch()) {
         QDBusInterface sim(OfonoService, modemPath, SimManagerInterface, QDBusConnection::systemBus());
         properties = readProperties(&sim);
     }

@@ -404,9 +404,11 @@ void ConnectivitySettingsTest::subscriberIdentities()
 
     QCOMPARE(settings.modemSimImsi(QStringLiteral("/ril_7")), QString());
     QCOMPARE(settings.modemSimImsi(QStringLiteral("no path")), QString());
+    QCOMPARE(settings.modemSimImsi(QString()), QString());
     QCOMPARE(m_log->takeWarnings(),
              texts({"Subscriber Identity property not returned for SIM: \"/ril_7\"",
-                    "Subscriber Identity property not returned for SIM: \"no path\""}));
+                    "Subscriber Identity property not returned for SIM: \"no path\"",
+                    "Subscriber Identity property not returned for SIM: \"\""}));
 }
 
 void ConnectivitySettingsTest::mobileNetworkImsis()
