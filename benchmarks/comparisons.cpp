@@ -81,7 +81,7 @@ public:
                     = run.GetAdjustedRealTime() * 1e6 / benchmark::GetTimeUnitMultiplier(run.time_unit);
             else if (run.aggregate_name == "cv")
                 m_results[name].variation
-                    = run.GetAdjustedRealTime() / benchmark::GetTimeUnitMultiplier(run.time_unit);
+                    = run.real_accumulated_time; // no time, and of all repetitions together
         }
     }
 
