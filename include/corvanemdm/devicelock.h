@@ -61,6 +61,7 @@ public:
         WipePartitions = 2, ///< erase the data partition as a whole
         ClearExternalMedia = 4 ///< erase memory cards as well
     };
+    /** Several of them. */
     Q_DECLARE_FLAGS(ClearOptions, ClearOption)
     Q_FLAG(ClearOptions)
 
