@@ -154,7 +154,8 @@ QVector<CellularSection::Item> CellularSection::itemsOf(const QJsonObject &wante
                 {Item::RadioTechnologies, imsi, AccessPoint::Internet, sim.value(technologiesMember), {}});
         }
         const QJsonObject accessPoints = sim.value(accessPointsMember).toObject();
-        for (const QString &name : accessPointTypeNames()) {
+        const QStringList names = accessPointTypeNames();
+        for (const QString &name : names) {
             if (accessPoints.contains(name)) {
                 items.append({Item::AccessPointOfType,
                               imsi,

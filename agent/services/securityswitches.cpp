@@ -37,7 +37,7 @@ Reply SecuritySwitches::setDeveloperMode(bool enabled)
               enabled ? QStringLiteral("install developer mode") : QStringLiteral("remove developer mode"));
     connect(&m_settings, &SecuritySettings::developerModeEnabledChanged, &wait,
             [&wait] { wait.end(Reply::Done); });
-    connect(&m_settings, &SecuritySettings::developerModeChangeError, &wait, [&] {
+    connect(&m_settings, &SecuritySettings::developerModeChangeError, &wait, [&wait, packages, enabled] {
         wait.end(
             Reply::Refused,
             QStringLiteral("%1 could not %2 the package of developer mode")

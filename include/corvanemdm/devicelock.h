@@ -41,7 +41,7 @@ class CORVANEMDM_EXPORT DeviceLock : public QObject
     /** Whether setSecurityCode() runs. */
     Q_PROPERTY(bool changingSecurityCode READ changingSecurityCode NOTIFY changingSecurityCodeChanged)
     /** Whether the user's data are encrypted; looked up with every read. */
-    Q_PROPERTY(bool homeEncrypted READ isHomeEncrypted)
+    Q_PROPERTY(bool homeEncrypted READ isHomeEncrypted) // clazy:exclude=qproperty-without-notify
 
 public:
     /** How the phone is locked. */

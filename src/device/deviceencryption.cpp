@@ -25,7 +25,7 @@ struct Free {
 
 void logMessage(int, const char *text, void *)
 {
-    qCDebug(lcEncryption).noquote() << QString::fromLocal8Bit(text).trimmed();
+    qCDebug(lcEncryption, "%s", qUtf8Printable(QString::fromLocal8Bit(text).trimmed()));
 }
 
 } // namespace
