@@ -5,6 +5,7 @@
 #include "wait.h"
 #include "warningcapture.h"
 
+#include <QtCore/QPointer>
 #include <QtDBus/QDBusConnection>
 
 #include <algorithm>
@@ -84,11 +85,15 @@ Reply PackageManager::perform(const QString &awaited, const std::function<Applic
 {
     Wait wait(Service::packageKit(), m_timeout, awaited);
     const WarningCapture toldAlready(noNews, [](const QString &) {});
-    connect(request(), &ApplicationOperation::finished, &wait, [&wait](ApplicationOperation *operation) {
-        const Reply outcome = outcomeOf(operation);
+    const QPointer<ApplicationOperation> operation(request());
+    connect(operation.data(), &ApplicationOperation::finished, &wait, [&wait](ApplicationOperation *ended) {
+        const Reply outcome = outcomeOf(ended);
         wait.end(outcome.outcome, outcome.text);
     });
-    return wait.run();
+    Reply reply = wait.run();
+    // It would go by itself, but the program may end first.
+    delete operation.data();
+    return reply;
 }
 
 } // namespace Agent

@@ -24,9 +24,9 @@ bool isSecretName(const gchar *name)
     return secret.match(QString::fromUtf8(name)).hasMatch();
 }
 
-GVariant *mask()
+Variant mask()
 {
-    return g_variant_new_string("***");
+    return Variant(g_variant_new_string("***"));
 }
 
 GDBusMethodInfo *methodOf(const JournalCall &call)
@@ -60,22 +60,24 @@ std::string signatureOf(const GDBusMethodInfo *method)
     return signature;
 }
 
-/** @p value, with what is named as a secret masked; floating or not. */
-GVariant *withNamedSecretsMasked(GVariant *value);
+/** @p value, with what is named as a secret masked. */
+Variant withNamedSecretsMasked(GVariant *value);
 
 /** The same for @p value behind the @p name of something. */
-GVariant *maskedBehind(const Variant &name, GVariant *value)
+Variant maskedBehind(const Variant &name, GVariant *value)
 {
     const bool isName = name && g_variant_is_of_type(name.get(), G_VARIANT_TYPE_STRING);
     if (!isName || !isSecretName(g_variant_get_string(name.get(), nullptr)))
         return withNamedSecretsMasked(value);
-    return g_variant_is_of_type(value, G_VARIANT_TYPE_VARIANT) ? g_variant_new_variant(mask()) : mask();
+    return g_variant_is_of_type(value, G_VARIANT_TYPE_VARIANT) ? Variant(g_variant_new_variant(mask().get()))
+                                                               : mask();
 }
 
-GVariant *withNamedSecretsMasked(GVariant *value)
+Variant withNamedSecretsMasked(GVariant *value)
 {
     if (g_variant_is_of_type(value, G_VARIANT_TYPE_VARIANT))
-        return g_variant_new_variant(withNamedSecretsMasked(Variant(g_variant_get_variant(value)).get()));
+        return Variant(
+            g_variant_new_variant(withNamedSecretsMasked(Variant(g_variant_get_variant(value)).get()).get()));
     if (g_variant_is_of_type(value, G_VARIANT_TYPE("a{sv}"))
         || g_variant_is_of_type(value, G_VARIANT_TYPE("a{ss}"))) {
         GVariantBuilder dictionary;
@@ -85,11 +87,11 @@ GVariant *withNamedSecretsMasked(GVariant *value)
             const Variant key(g_variant_get_child_value(entry.get(), 0));
             const Variant content(g_variant_get_child_value(entry.get(), 1));
             g_variant_builder_add_value(
-                &dictionary, g_variant_new_dict_entry(key.get(), maskedBehind(key, content.get())));
+                &dictionary, g_variant_new_dict_entry(key.get(), maskedBehind(key, content.get()).get()));
         }
-        return g_variant_builder_end(&dictionary);
+        return Variant(g_variant_builder_end(&dictionary));
     }
-    return g_variant_ref(value);
+    return Variant::shared(value);
 }
 
 } // namespace
@@ -110,7 +112,7 @@ std::string argumentsWithoutSecrets(const JournalCall &call)
     for (gsize i = 0; i < g_variant_n_children(arguments.get()); ++i) {
         const Variant argument(g_variant_get_child_value(arguments.get(), i));
         const bool masked = method && signatureOf(method) == call.signature && isSecret(method->in_args[i]);
-        const Variant value(masked ? mask() : maskedBehind(previous, argument.get()));
+        const Variant value = masked ? mask() : maskedBehind(previous, argument.get());
         g_variant_builder_add_value(&shown, value.get());
         previous = argument;
     }

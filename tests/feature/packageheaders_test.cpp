@@ -50,6 +50,13 @@ QString textOf(const PackageEntry &package)
 
 } // namespace
 
+// librpm does not close a database that is none.
+extern "C" const char *__lsan_default_suppressions();
+extern "C" const char *__lsan_default_suppressions()
+{
+    return "leak:libsqlite3";
+}
+
 Q_DECLARE_METATYPE(std::function<void(Header)>)
 
 /** What the package database may hold that is not as it should be. */
