@@ -51,7 +51,7 @@ QString textOf(const PackageEntry &package)
 } // namespace
 
 // librpm does not close a database that is none.
-extern "C" const char *__lsan_default_suppressions();
+extern "C" Q_DECL_EXPORT const char *__lsan_default_suppressions();
 extern "C" const char *__lsan_default_suppressions()
 {
     return "leak:libsqlite3";
