@@ -138,7 +138,10 @@ void SimVoiceCallFilterTest::isNotReadyWhenBothAnswersFail()
     SimVoiceCallFilter filter;
     SignalSequence seen(&filter);
     phone().settle(Service);
-    QCOMPARE(log.takeWarnings(),
+    // Which of the two answers is taken up first is open.
+    QStringList warnings = log.takeWarnings();
+    warnings.sort();
+    QCOMPARE(warnings,
              texts({"(dial) GetAll() failed: \"com.example.Broken\" \"\"",
                     "(incoming) GetAll() failed: \"com.example.Broken\" \"\""}));
     QCOMPARE(seen.take(), QStringList());
