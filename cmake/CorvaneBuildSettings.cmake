@@ -27,6 +27,8 @@ file(RELATIVE_PATH PKGCONFIG_TO_PREFIX ${CMAKE_INSTALL_FULL_LIBDIR}/pkgconfig ${
 string(REGEX REPLACE "/$" "" PKGCONFIG_TO_PREFIX "${PKGCONFIG_TO_PREFIX}")
 
 add_compile_options(-Wall -Wextra -Wpedantic -Wshadow)
+# GLib's users are compiled with it, and precompiled headers fit those alone who are compiled alike.
+add_compile_options(-pthread)
 add_compile_definitions(QT_NO_CAST_FROM_ASCII QT_NO_CAST_TO_ASCII QT_NO_KEYWORDS
                         QT_DISABLE_DEPRECATED_BEFORE=0x050f00)
 add_link_options(-Wl,--as-needed)
