@@ -16,6 +16,8 @@
 #include <QtDBus/QDBusMessage>
 #include <QtDBus/QDBusPendingCallWatcher>
 
+#include <utility>
+
 namespace Corvane
 {
 namespace Agent
@@ -104,6 +106,17 @@ QJsonObject readingJson(const TrafficMeter::Reading &reading)
     };
 }
 
+/**
+ * Asks what the connection manager answers once it has dealt with all that it was asked before. A "Ping"
+ * would not do: libraries answer it ahead of their program.
+ */
+QDBusPendingCall askLast(const Service &manager)
+{
+    return QDBusConnection::systemBus().asyncCall(QDBusMessage::createMethodCall(
+        manager.name, QStringLiteral("/"), QStringLiteral("net.connman.Manager"),
+        QStringLiteral("GetProperties")));
+}
+
 int runWatch(const Values &values)
 {
     NetworkDataCounter counter;
@@ -118,8 +131,15 @@ int runWatch(const Values &values)
     QElapsedTimer clock;
     clock.start();
     Wait wait(Service::connectionManager(), Wait::Forever, QString());
+    bool isAnnounced = isLive;
+    const auto announce = [&] {
+        if (!std::exchange(isAnnounced, true))
+            log.write(QStringLiteral("Counting data."),
+                      {{QStringLiteral("event"), QStringLiteral("watching")}});
+    };
     QObject::connect(&counter, &NetworkDataCounter::counterUpdate, &wait,
                      [&](const NetworkDataCounter::Update &update) {
+                         announce();
                          const TrafficMeter::Reading &reading = meter.take(update, clock.elapsed());
                          if (isLive)
                              table.show(tableText(meter));
@@ -127,6 +147,12 @@ int runWatch(const Values &values)
                              log.write(lineText(reading), readingJson(reading));
                      });
     counter.setActive(true);
+    // Whoever reads that data is counted may rely on it, so the registration has been taken by then.
+    QDBusPendingCallWatcher last(askLast(Service::connectionManager()));
+    QObject::connect(&last, &QDBusPendingCallWatcher::finished, &wait, [&] {
+        if (!last.isError() && !wait.isOver())
+            announce();
+    });
     QObject::connect(&counter, &NetworkDataCounter::activeChanged, &wait, [&] {
         const Service manager = Service::connectionManager();
         wait.end(manager.isRunning() ? Reply::Refused : Reply::ServiceLost,
@@ -135,8 +161,6 @@ int runWatch(const Values &values)
     });
     if (isLive)
         table.show(tableText(meter));
-    else
-        log.write(QStringLiteral("Counting data."), {{QStringLiteral("event"), QStringLiteral("watching")}});
     return concludeWatch(wait.run());
 }
 
@@ -149,9 +173,7 @@ int runReset(const Values &values)
     for (const QString &network : networks)
         counter.resetCounter(servicePathPrefix + network);
     // Only refusals are told. Answers come in the order of the questions, so this one's is the last.
-    QDBusPendingCallWatcher last(QDBusConnection::systemBus().asyncCall(
-        QDBusMessage::createMethodCall(manager.name, QStringLiteral("/"),
-                                       QStringLiteral("org.freedesktop.DBus.Peer"), QStringLiteral("Ping"))));
+    QDBusPendingCallWatcher last(askLast(manager));
     QObject::connect(&last, &QDBusPendingCallWatcher::finished, &wait, [&wait] { wait.end(Reply::Done); });
     const Reply reply = wait.run();
     if (reply.isDone()) {

@@ -45,6 +45,9 @@ public:
     /** Ends the wait; later ends are ignored. */
     void end(Reply::Outcome outcome, const QString &text = QString());
 
+    /** Whether it has ended, although run() may not have returned yet. */
+    bool isOver() const { return m_ended; }
+
     /** Starts the time anew, as something happened. */
     void prolong();
 

@@ -1,6 +1,7 @@
 // SPDX-License-Identifier: LGPL-2.1-or-later
 #include "mdmctl.h"
 #include "phone.h"
+#include "waiting.h"
 
 #include <QtCore/QJsonArray>
 #include <QtTest/QtTest>
@@ -29,6 +30,8 @@ private Q_SLOTS:
 
     void watchTellsTraffic();
     void watchAsJson();
+    void watchStartsWithTheRegistration();
+    void watchThatIsRefused();
     void watchEndsWithARelease();
     void watchEndsWithTheService();
     void resetCountsAnew();
@@ -43,6 +46,9 @@ private:
         m_phone.act(QLatin1String(action), arguments);
     }
 
+    /** How many the connection manager knows. */
+    int registeredCounters() const;
+
     Phone m_phone;
 };
 
@@ -52,13 +58,22 @@ void MdmctlCountersTest::cleanup()
     m_phone.startService(Service);
 }
 
+int MdmctlCountersTest::registeredCounters() const
+{
+    return m_phone.state()
+        .value(QLatin1String("network"))
+        .toObject()
+        .value(QLatin1String("counters"))
+        .toArray()
+        .size();
+}
+
 void MdmctlCountersTest::watchTellsTraffic()
 {
     run(qPrintable(QStringLiteral("counters reset ") + Office));
     Mdmctl watch({QStringLiteral("counters"), QStringLiteral("watch"), QStringLiteral("--accuracy"),
                   QStringLiteral("1"), QStringLiteral("--interval"), QStringLiteral("60")});
     QVERIFY(watch.waitForOutput(QStringLiteral("Counting data.")));
-    m_phone.settle(Service);
     act("connection traffic", {Office, QStringLiteral("3145728"), QStringLiteral("2048")});
     QVERIFY(watch.waitForOutput(Office + QStringLiteral(" (wlan): 3.0 MiB received (")));
     watch.interrupt(SIGINT);
@@ -66,21 +81,17 @@ void MdmctlCountersTest::watchTellsTraffic()
     QCOMPARE(watched.errors, QString());
     QCOMPARE(watched.status, 0);
     QVERIFY(watched.output.contains(QStringLiteral("2.0 KiB sent (")));
-    // It is gone from the connection manager as well.
-    m_phone.settle(Service);
-    QVERIFY(m_phone.state()
-                .value(QLatin1String("network"))
-                .toObject()
-                .value(QLatin1String("counters"))
-                .toArray()
-                .isEmpty());
+    // It goes from the connection manager as well, which may hear of it later than this test.
+    QVERIFY(waitUntil([this] {
+        m_phone.settle(Service);
+        return registeredCounters() == 0;
+    }));
 }
 
 void MdmctlCountersTest::watchAsJson()
 {
     Mdmctl watch({QStringLiteral("counters"), QStringLiteral("watch"), QStringLiteral("--json")});
     QVERIFY(watch.waitForOutput(QStringLiteral("\"watching\"")));
-    m_phone.settle(Service);
     act("counter usage",
         {QStringLiteral("/net/connman/service/cellular_1_context1"),
          QStringLiteral("{'RX.Bytes': <uint64 1000>, 'TX.Bytes': <uint64 10>, 'Time': <uint64 7>}"),
@@ -103,11 +114,47 @@ void MdmctlCountersTest::watchAsJson()
     QCOMPARE(usage.at(1).value(QLatin1String("kind")).toString(), QStringLiteral("roaming"));
 }
 
+void MdmctlCountersTest::watchStartsWithTheRegistration()
+{
+    // Both ways to say so: who reads it may count on every byte from then on.
+    for (const bool asJson : {false, true}) {
+        Mdmctl watch(QStringList{QStringLiteral("counters"), QStringLiteral("watch")}
+                     + (asJson ? QStringList(QStringLiteral("--json")) : QStringList()));
+        QVERIFY(
+            watch.waitForOutput(asJson ? QStringLiteral("\"watching\"") : QStringLiteral("Counting data.")));
+        QCOMPARE(registeredCounters(), 1);
+        // Reports come after it, also those that the registration itself brings.
+        QVERIFY(watch.waitForOutput(asJson ? QStringLiteral("\"usage\"") : Office));
+        watch.interrupt(SIGINT);
+        const QStringList lines = watch.finish().output.split(QLatin1Char('\n'));
+        QVERIFY2(
+            lines.first().contains(asJson ? QStringLiteral("watching") : QStringLiteral("Counting data.")),
+            qPrintable(lines.first()));
+        QCOMPARE(lines.filter(asJson ? QStringLiteral("watching") : QStringLiteral("Counting data.")).size(),
+                 1);
+        QVERIFY(waitUntil([this] {
+            m_phone.settle(Service);
+            return registeredCounters() == 0;
+        }));
+    }
+}
+
+void MdmctlCountersTest::watchThatIsRefused()
+{
+    m_phone.failCalls(Service, QStringLiteral("/"), QStringLiteral("RegisterCounter"),
+                      QStringLiteral("net.connman.Error.AlreadyExists"), QStringLiteral("Already exists"));
+    const Mdmctl::Result refused = run("counters watch");
+    QCOMPARE(refused.output, QString());
+    QCOMPARE(refused.status, 1);
+    QVERIFY2(
+        refused.errors.startsWith(QLatin1String("mdmctl: the connection manager (net.connman) refused: ")),
+        qPrintable(refused.errors));
+}
+
 void MdmctlCountersTest::watchEndsWithARelease()
 {
     Mdmctl watch({QStringLiteral("counters"), QStringLiteral("watch")});
     QVERIFY(watch.waitForOutput(QStringLiteral("Counting data.")));
-    m_phone.settle(Service);
     act("counter release");
     const Mdmctl::Result watched = watch.finish();
     QCOMPARE(watched.status, 1);
