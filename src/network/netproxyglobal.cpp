@@ -29,36 +29,6 @@ NetProxyGlobal::NetProxyGlobal(NetProxy *netProxy, NetProxyPrivate *netProxyPriv
               &NetProxyPrivate::onGetPropertyFinishedConfiguration);
 }
 
-bool NetProxyGlobal::setType(NetProxy::ProxyType type)
-{
-    if (type < NetProxy::Direct || type > NetProxy::Automatic)
-        return false;
-    const bool isChange = mirror.setType(type);
-    globalUpdateRemoteFromLocal(NetProxyPrivate::ChangeType);
-    return isChange;
-}
-
-bool NetProxyGlobal::setManualProxies(const QList<QUrl> &proxies)
-{
-    const bool isChange = mirror.setManualProxies(proxies);
-    globalUpdateRemoteFromLocal(NetProxyPrivate::ChangeServers);
-    return isChange;
-}
-
-bool NetProxyGlobal::setManualExclusions(const QStringList &exclusions)
-{
-    const bool isChange = mirror.setManualExclusions(exclusions);
-    globalUpdateRemoteFromLocal(NetProxyPrivate::ChangeExcludes);
-    return isChange;
-}
-
-bool NetProxyGlobal::setAutomaticUrl(const QUrl &url)
-{
-    const bool isChange = mirror.setAutomaticUrl(url);
-    globalUpdateRemoteFromLocal(NetProxyPrivate::ChangeUrl);
-    return isChange;
-}
-
 QString NetProxyGlobal::getIdentifier() const
 {
     return QStringLiteral("global");
@@ -67,26 +37,6 @@ QString NetProxyGlobal::getIdentifier() const
 QString NetProxyGlobal::getName() const
 {
     return QStringLiteral("Global Proxy");
-}
-
-NetProxy::ProxyType NetProxyGlobal::getType() const
-{
-    return mirror.type;
-}
-
-QList<QUrl> NetProxyGlobal::getManualProxies() const
-{
-    return QUrl::fromStringList(mirror.servers);
-}
-
-QStringList NetProxyGlobal::getManualExclusions() const
-{
-    return mirror.excludes;
-}
-
-QUrl NetProxyGlobal::getAutomaticUrl() const
-{
-    return QUrl(mirror.url);
 }
 
 void NetProxyGlobal::setProxyConfig(const QVariantMap &configuration)

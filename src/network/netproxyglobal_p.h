@@ -19,16 +19,8 @@ class NetProxyGlobal : public QObject, public NetProxyInterface
 public:
     NetProxyGlobal(NetProxy *netProxy, NetProxyPrivate *netProxyPrivate);
 
-    bool setType(NetProxy::ProxyType type) override;
-    bool setManualProxies(const QList<QUrl> &proxies) override;
-    bool setManualExclusions(const QStringList &exclusions) override;
-    bool setAutomaticUrl(const QUrl &url) override;
     QString getIdentifier() const override;
     QString getName() const override;
-    NetProxy::ProxyType getType() const override;
-    QList<QUrl> getManualProxies() const override;
-    QStringList getManualExclusions() const override;
-    QUrl getAutomaticUrl() const override;
     void setProxyConfig(const QVariantMap &configuration) override;
 
     bool applyActive(bool isActive);
@@ -37,6 +29,9 @@ public:
 
     bool active = false; ///< whether it is used in place of those of the networks
     GlobalProxyInterfaceProxy *proxy;
+
+protected:
+    bool hasTarget() const override { return true; }
 
 private:
     NetProxy *const q;

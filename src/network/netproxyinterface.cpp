@@ -62,6 +62,47 @@ bool NetProxyInterface::ProxyLocalMirror::setAutomaticUrl(const QUrl &newUrl)
     return true;
 }
 
+bool NetProxyInterface::setType(NetProxy::ProxyType type)
+{
+    return hasTarget() && type >= NetProxy::Direct && type <= NetProxy::Automatic
+        && update(mirror.setType(type), NetProxyPrivate::ChangeType);
+}
+
+bool NetProxyInterface::setManualProxies(const QList<QUrl> &proxies)
+{
+    return hasTarget() && update(mirror.setManualProxies(proxies), NetProxyPrivate::ChangeServers);
+}
+
+bool NetProxyInterface::setManualExclusions(const QStringList &exclusions)
+{
+    return hasTarget() && update(mirror.setManualExclusions(exclusions), NetProxyPrivate::ChangeExcludes);
+}
+
+bool NetProxyInterface::setAutomaticUrl(const QUrl &url)
+{
+    return hasTarget() && update(mirror.setAutomaticUrl(url), NetProxyPrivate::ChangeUrl);
+}
+
+NetProxy::ProxyType NetProxyInterface::getType() const
+{
+    return hasTarget() ? mirror.type : NetProxy::Invalid;
+}
+
+QList<QUrl> NetProxyInterface::getManualProxies() const
+{
+    return hasTarget() ? QUrl::fromStringList(mirror.servers) : QList<QUrl>();
+}
+
+QStringList NetProxyInterface::getManualExclusions() const
+{
+    return hasTarget() ? mirror.excludes : QStringList();
+}
+
+QUrl NetProxyInterface::getAutomaticUrl() const
+{
+    return hasTarget() ? QUrl(mirror.url) : QUrl();
+}
+
 quint32 NetProxyInterface::applyConfiguration(const QVariantMap &configuration)
 {
     const QString method = configuration.value(MethodKey, QString(DirectMethod)).toString();
@@ -80,6 +121,13 @@ quint32 NetProxyInterface::applyConfiguration(const QVariantMap &configuration)
             | store(&mirror.url, configuration.value(UrlKey).toString(), NetProxyPrivate::ChangeUrl);
     }
     return 0;
+}
+
+/** What was set goes to the connection manager, even if it is no change; returns whether it is one. */
+bool NetProxyInterface::update(bool isChange, NetProxyPrivate::ConfigChange change)
+{
+    globalUpdateRemoteFromLocal(change);
+    return isChange;
 }
 
 /** What of @p changes was made here is confirmed, hence to be announced, even if nothing comes of it. */

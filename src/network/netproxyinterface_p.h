@@ -11,7 +11,7 @@ namespace Corvane
 namespace Mdm
 {
 
-/** One proxy configuration of the connection manager, with a local copy of it. */
+/** One proxy configuration of the connection manager, with a local copy of it that is read and written. */
 class NetProxyInterface
 {
 public:
@@ -29,16 +29,17 @@ public:
         QString url;
     };
 
-    virtual bool setType(NetProxy::ProxyType type) = 0;
-    virtual bool setManualProxies(const QList<QUrl> &proxies) = 0;
-    virtual bool setManualExclusions(const QStringList &exclusions) = 0;
-    virtual bool setAutomaticUrl(const QUrl &url) = 0;
+    // The setters return whether they have changed something; what is complete is sent in any case.
+    virtual bool setType(NetProxy::ProxyType type);
+    virtual bool setManualProxies(const QList<QUrl> &proxies);
+    virtual bool setManualExclusions(const QStringList &exclusions);
+    virtual bool setAutomaticUrl(const QUrl &url);
     virtual QString getIdentifier() const = 0;
     virtual QString getName() const = 0;
-    virtual NetProxy::ProxyType getType() const = 0;
-    virtual QList<QUrl> getManualProxies() const = 0;
-    virtual QStringList getManualExclusions() const = 0;
-    virtual QUrl getAutomaticUrl() const = 0;
+    virtual NetProxy::ProxyType getType() const;
+    virtual QList<QUrl> getManualProxies() const;
+    virtual QStringList getManualExclusions() const;
+    virtual QUrl getAutomaticUrl() const;
     /** Hands a complete configuration to the connection manager. */
     virtual void setProxyConfig(const QVariantMap &configuration) = 0;
     virtual ~NetProxyInterface() = default;
@@ -51,7 +52,13 @@ public:
 
     ProxyLocalMirror mirror;
 
+protected:
+    /** Whether there is something to configure. Without it nothing can be set, and all that is read is empty.
+     */
+    virtual bool hasTarget() const = 0;
+
 private:
+    bool update(bool isChange, NetProxyPrivate::ConfigChange change);
     quint32 takeChanges(quint32 changes);
     quint32 applyType(NetProxy::ProxyType type);
 };

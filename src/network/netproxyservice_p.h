@@ -22,16 +22,8 @@ class NetProxyService : public QObject, public NetProxyInterface
 public:
     NetProxyService(NetProxy *netProxy, NetProxyPrivate *netProxyPrivate);
 
-    bool setType(NetProxy::ProxyType type) override;
-    bool setManualProxies(const QList<QUrl> &proxies) override;
-    bool setManualExclusions(const QStringList &exclusions) override;
-    bool setAutomaticUrl(const QUrl &url) override;
     QString getIdentifier() const override;
     QString getName() const override;
-    NetProxy::ProxyType getType() const override;
-    QList<QUrl> getManualProxies() const override;
-    QStringList getManualExclusions() const override;
-    QUrl getAutomaticUrl() const override;
     void setProxyConfig(const QVariantMap &configuration) override;
 
     QPointer<NetworkManager>
@@ -40,6 +32,9 @@ public:
 
 public Q_SLOTS:
     void managerValidChanged();
+
+protected:
+    bool hasTarget() const override { return service != nullptr; }
 
 private:
     NetProxy *const q;

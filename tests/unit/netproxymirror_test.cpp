@@ -27,19 +27,15 @@ const QString NewUrl = QStringLiteral("http://new/pac");
 class RecordingProxy : public NetProxyInterface
 {
 public:
-    bool setType(NetProxy::ProxyType) override { return false; }
-    bool setManualProxies(const QList<QUrl> &) override { return false; }
-    bool setManualExclusions(const QStringList &) override { return false; }
-    bool setAutomaticUrl(const QUrl &) override { return false; }
     QString getIdentifier() const override { return QString(); }
     QString getName() const override { return QString(); }
-    NetProxy::ProxyType getType() const override { return mirror.type; }
-    QList<QUrl> getManualProxies() const override { return {}; }
-    QStringList getManualExclusions() const override { return {}; }
-    QUrl getAutomaticUrl() const override { return QUrl(); }
     void setProxyConfig(const QVariantMap &configuration) override { sent.append(configuration); }
 
     QList<QVariantMap> sent;
+    bool isThere = true;
+
+protected:
+    bool hasTarget() const override { return isThere; }
 };
 
 QVariantMap configuration(const char *method, const QVariantMap &rest = QVariantMap())
@@ -67,6 +63,8 @@ private Q_SLOTS:
     void handsOver();
     void invalidIsLogged();
     void settersTellOfChanges();
+    void settersSend();
+    void nothingThereIsEmpty();
     void pathsAndIdentifiers_data();
     void pathsAndIdentifiers();
 };
@@ -280,6 +278,57 @@ void NetProxyMirrorTest::settersTellOfChanges()
     mirror.changes = 0;
     QVERIFY(!mirror.setAutomaticUrl(QUrl(OldUrl)));
     QCOMPARE(mirror.changes, 0u);
+}
+
+void NetProxyMirrorTest::settersSend()
+{
+    RecordingProxy proxy;
+    for (const int type : {-1, 0, 4})
+        QVERIFY(!proxy.setType(NetProxy::ProxyType(type)));
+    QCOMPARE(proxy.sent.size(), 0);
+    QVERIFY(proxy.setType(NetProxy::Manual));
+    QVERIFY(proxy.setManualExclusions({OldHost}));
+    QCOMPARE(proxy.sent.size(), 0);
+    QVERIFY(proxy.setManualProxies({QUrl(OldServer)}));
+    QCOMPARE(proxy.sent.size(), 1);
+    QCOMPARE(proxy.sent.first(),
+             configuration("manual",
+                           {{QStringLiteral("Servers"), QStringList(OldServer)},
+                            {QStringLiteral("Excludes"), QStringList(OldHost)}}));
+    QVERIFY(proxy.setAutomaticUrl(QUrl(OldUrl)));
+    QCOMPARE(proxy.sent.size(), 1);
+    // What is no change is sent all the same.
+    QVERIFY(!proxy.setManualProxies({QUrl(OldServer)}));
+    QVERIFY(!proxy.setManualExclusions({OldHost}));
+    QVERIFY(!proxy.setType(NetProxy::Manual));
+    QCOMPARE(proxy.sent.size(), 4);
+    QVERIFY(proxy.setType(NetProxy::Automatic));
+    QVERIFY(!proxy.setAutomaticUrl(QUrl(OldUrl)));
+    QCOMPARE(proxy.sent.size(), 6);
+    QCOMPARE(proxy.sent.last(), configuration("auto", {{QStringLiteral("URL"), OldUrl}}));
+    QCOMPARE(proxy.getType(), NetProxy::Automatic);
+    QCOMPARE(proxy.getManualProxies(), QList<QUrl>{QUrl(OldServer)});
+    QCOMPARE(proxy.getManualExclusions(), QStringList(OldHost));
+    QCOMPARE(proxy.getAutomaticUrl(), QUrl(OldUrl));
+}
+
+void NetProxyMirrorTest::nothingThereIsEmpty()
+{
+    RecordingProxy proxy;
+    proxy.mirror = {0, NetProxy::Manual, QStringList(OldServer), QStringList(OldHost), OldUrl};
+    proxy.isThere = false;
+    QCOMPARE(proxy.getType(), NetProxy::Invalid);
+    QCOMPARE(proxy.getManualProxies(), QList<QUrl>());
+    QCOMPARE(proxy.getManualExclusions(), QStringList());
+    QCOMPARE(proxy.getAutomaticUrl(), QUrl());
+    QVERIFY(!proxy.setType(NetProxy::Direct));
+    QVERIFY(!proxy.setManualProxies({QUrl(NewServer)}));
+    QVERIFY(!proxy.setManualExclusions({NewHost}));
+    QVERIFY(!proxy.setAutomaticUrl(QUrl(NewUrl)));
+    QCOMPARE(proxy.sent.size(), 0);
+    QCOMPARE(proxy.mirror.changes, 0u);
+    QCOMPARE(proxy.mirror.type, NetProxy::Manual);
+    QCOMPARE(proxy.mirror.servers, QStringList(OldServer));
 }
 
 void NetProxyMirrorTest::pathsAndIdentifiers_data()
