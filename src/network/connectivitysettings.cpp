@@ -281,33 +281,27 @@ QString typeWord(const ObjectPathProperties &object)
     return object.properties.value(TypeProperty).toString();
 }
 
-/** Writes all of @p settings; what is refused is logged. */
+/** Writes all of @p settings, one after the other; what is refused is logged. */
 bool writeAccessPoint(QDBusInterface *context, const AccessPoint &settings, const QString &imsi)
 {
-    const struct {
-        QLatin1String property;
-        QString value;
-        const char *failure;
-    } writes[] = {
-        {NameProperty, settings.name, "Unable to set connection name for the given IMSI:"},
-        {AccessPointNameProperty, settings.accessPointName,
-         "Unable to set access point name for the given IMSI:"},
-        {UsernameProperty, settings.username, "Unable to set username for the given IMSI:"},
-        {PasswordProperty, settings.password, "Unable to set password for the given IMSI:"},
-        // Agents look for this text, which is not that of the property.
-        {AuthenticationMethodProperty, wordFor(settings.authenticationMethod),
-         "Unable to set protocol for the given IMSI:"},
-        {ProtocolProperty, wordFor(settings.protocol), "Unable to set protocol for the given IMSI:"},
-        {MessageCenterProperty, settings.messageCenter, "Unable to set message center for the given IMSI:"},
-        {MessageProxyProperty, settings.messageProxy, "Unable to set message proxy for the given IMSI:"},
-    };
     bool areTaken = true;
-    for (const auto &write : writes) {
-        if (writeProperty(context, write.property, write.value).isValid()) {
-            qWarning() << write.failure << imsi;
-            areTaken = false;
-        }
-    }
+    const auto write = [&](QLatin1String property, const QString &value, const char *failure) {
+        if (!writeProperty(context, property, value).isValid())
+            return;
+        qWarning() << failure << imsi;
+        areTaken = false;
+    };
+    write(NameProperty, settings.name, "Unable to set connection name for the given IMSI:");
+    write(AccessPointNameProperty, settings.accessPointName,
+          "Unable to set access point name for the given IMSI:");
+    write(UsernameProperty, settings.username, "Unable to set username for the given IMSI:");
+    write(PasswordProperty, settings.password, "Unable to set password for the given IMSI:");
+    // Agents look for this text, which is not that of the property.
+    write(AuthenticationMethodProperty, wordFor(settings.authenticationMethod),
+          "Unable to set protocol for the given IMSI:");
+    write(ProtocolProperty, wordFor(settings.protocol), "Unable to set protocol for the given IMSI:");
+    write(MessageCenterProperty, settings.messageCenter, "Unable to set message center for the given IMSI:");
+    write(MessageProxyProperty, settings.messageProxy, "Unable to set message proxy for the given IMSI:");
     return areTaken;
 }
 

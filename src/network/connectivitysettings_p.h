@@ -48,7 +48,8 @@ public:
     bool switchMobileData(const QString &imsi, const MobileDataSwitch &wanted);
 
     ConnectivitySettings *const q;
-    NetworkManager *networkManager = nullptr;
+    QPointer<NetworkManager>
+        networkManager; ///< not ours, and of the thread: it may be gone at the end of the program
     QPointer<NetworkTechnology> wlanTechnology;
     QDBusInterface *wlanTechInterface = nullptr;
     QDBusInterface *connmanManagerInterface = nullptr;

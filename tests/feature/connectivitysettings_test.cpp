@@ -199,6 +199,7 @@ private Q_SLOTS:
     void writesAnAccessPoint();
     void writesWordsForStrangeValues_data();
     void writesWordsForStrangeValues();
+    void warningsComeInTheOrderOfTheWrites();
     void writesThatFail_data();
     void writesThatFail();
     void writesTheFirstOfItsType();
@@ -834,6 +835,22 @@ void ConnectivitySettingsTest::writesWordsForStrangeValues()
              MmsContext + QStringLiteral(" SetProperty ('AuthenticationMethod', <'%1'>)").arg(methodWord));
     QCOMPARE(writes.at(5),
              MmsContext + QStringLiteral(" SetProperty ('Protocol', <'%1'>)").arg(protocolWord));
+}
+
+void ConnectivitySettingsTest::warningsComeInTheOrderOfTheWrites()
+{
+    ConnectivitySettings settings;
+    AccessPoint point = companyAccessPoint(AccessPoint::Mms);
+    point.protocol = AccessPoint::Protocol(5);
+    m_phone->failCalls(Ofono, MmsContext, SetProperty, Failed, Broken);
+    QVERIFY(!settings.setAccessPointSettings(FirstImsi, point));
+    const QStringList warnings = m_log->takeWarnings();
+    QCOMPARE(warnings.size(), 9);
+    QCOMPARE(warnings.at(3),
+             QStringLiteral("Unable to set password for the given IMSI: \"244051234567890\""));
+    const QString protocol = QStringLiteral("Unable to set protocol for the given IMSI: \"244051234567890\"");
+    QCOMPARE(warnings.mid(4, 3),
+             (QStringList{protocol, QStringLiteral("Unknown protocol: 5 , assuming ip"), protocol}));
 }
 
 void ConnectivitySettingsTest::writesThatFail_data()
