@@ -66,12 +66,17 @@ private Q_SLOTS:
     void init();
     void cleanup();
 
+    void metaObject_data();
+    void metaObject();
     void freshObject();
     void becomesValidWithTheGlobalProxy();
     void keepsAnEarlierSelection();
+    void firstReadingIsSilent();
+    void announcementsMakeItValid();
     void withoutTheConnectionManager();
     void globalProxyThatCannotBeRead_data();
     void globalProxyThatCannotBeRead();
+    void globalProxyThatIsNoVariant();
 
     void selectsAndUnselects();
     void selectsNothingThatIsNotSaved_data();
@@ -99,8 +104,10 @@ private Q_SLOTS:
     void changesOfOthersAreSilent();
     void selectionIsSilent();
     void networkThatIsNotReadyIsSilent();
+    void networkThatBecomesReadyIsSilent();
 
     void switchesTheActiveType();
+    void refusedActiveType();
     void everyAnnouncementOfTheActiveType();
     void unknownProperty();
     void configurationOfAnotherType();
@@ -188,6 +195,48 @@ std::unique_ptr<NetProxy> NetProxyTest::selected(const QString &identifier)
     return proxy;
 }
 
+void NetProxyTest::metaObject_data()
+{
+    QTest::addColumn<bool>("isWritable");
+    QTest::addColumn<QByteArray>("type");
+    QTest::addColumn<QByteArray>("notification");
+    const auto row = [](const char *property, bool isWritable, const char *type, const char *notification) {
+        QTest::newRow(property) << isWritable << QByteArray(type) << QByteArray(notification);
+    };
+    row("valid", false, "bool", "validChanged(bool)");
+    row("type", true, "Corvane::Mdm::NetProxy::ProxyType", "typeChanged(ProxyType)");
+    row("manualProxies", true, "QList<QUrl>", "manualProxiesChanged(QList<QUrl>)");
+    row("manualExclusions", true, "QStringList", "manualExclusionsChanged(QStringList)");
+    row("automaticUrl", true, "QUrl", "automaticUrlChanged(QUrl)");
+    row("activeType", true, "Corvane::Mdm::NetProxy::ActiveType", "activeTypeChanged(ActiveType)");
+}
+
+void NetProxyTest::metaObject()
+{
+    QFETCH(bool, isWritable);
+    const QMetaObject &meta = NetProxy::staticMetaObject;
+    const QMetaProperty property = meta.property(meta.indexOfProperty(QTest::currentDataTag()));
+    QVERIFY(property.isReadable());
+    QCOMPARE(property.isWritable(), isWritable);
+    QTEST(QByteArray(property.typeName()), "type");
+    QTEST(property.notifySignal().methodSignature(), "notification");
+
+    QCOMPARE(meta.propertyCount() - QObject::staticMetaObject.propertyCount(), 6);
+    QVERIFY(meta.indexOfSignal("proxyConfigChanged()") >= 0);
+    QCOMPARE(QByteArray(meta.enumerator(meta.enumeratorOffset()).name()), QByteArray("ProxyType"));
+    const auto types = QMetaEnum::fromType<NetProxy::ProxyType>();
+    const auto activeTypes = QMetaEnum::fromType<NetProxy::ActiveType>();
+    for (const auto &[key, value] : {std::pair("Invalid", 0), {"Direct", 1}, {"Manual", 2}, {"Automatic", 3}})
+        QCOMPARE(types.keyToValue(key), value);
+    QCOMPARE(types.keyCount(), 4);
+    QCOMPARE(activeTypes.keyToValue("Service"), 0);
+    QCOMPARE(activeTypes.keyToValue("Global"), 1);
+    QCOMPARE(activeTypes.keyCount(), 2);
+    // Methods are no slots.
+    for (int index = meta.methodOffset(); index < meta.methodCount(); ++index)
+        QCOMPARE(meta.method(index).methodType(), QMetaMethod::Signal);
+}
+
 void NetProxyTest::freshObject()
 {
     NetProxy proxy;
@@ -211,6 +260,8 @@ void NetProxyTest::becomesValidWithTheGlobalProxy()
 {
     configure(Global, {QStringLiteral("auto"), QStringLiteral("http://pac")});
     act("proxy active", {QStringLiteral("on")});
+    settle(); // it has been announced
+    m_phone->takeJournal(Service);
     NetProxy proxy;
     SignalSequence seen(&proxy);
     QString atFirstSignal;
@@ -247,6 +298,45 @@ void NetProxyTest::keepsAnEarlierSelection()
     propertyChanged("Configuration", QVariantMap());
     QVERIFY(proxy.isValid());
     QCOMPARE(proxy.getIdentifier(), Home);
+}
+
+void NetProxyTest::firstReadingIsSilent()
+{
+    configure(Global, list("manual|http://first:1|a"));
+    act("proxy active", {QStringLiteral("on")});
+    settle(); // it has been announced
+    NetProxy proxy;
+    QVERIFY(proxy.selectProxy(Global));
+    SignalSequence seen(&proxy);
+    QVERIFY(waitUntil([&] { return proxy.isValid(); }));
+    settle();
+    QCOMPARE(seen.take(), list("validChanged(true)"));
+    QCOMPARE(proxy.manualProxies(), urls("http://first:1"));
+    QCOMPARE(proxy.activeType(), NetProxy::Global);
+}
+
+void NetProxyTest::announcementsMakeItValid()
+{
+    m_phone->swallowCalls(Service, Root, QStringLiteral("GetProperty"));
+    NetProxy proxy;
+    QVERIFY(proxy.selectProxy(Global));
+    settle();
+    SignalSequence seen(&proxy);
+    propertyChanged("Configuration", QVariantMap());
+    QCOMPARE(seen.take(), list("proxyConfigChanged()|typeChanged(Direct)"));
+    // What has changed is told before that it is valid.
+    propertyChanged("Active", true);
+    QCOMPARE(seen.take(), list("activeTypeChanged(Global)|proxyConfigChanged()|validChanged(true)"));
+    // Of what nobody has selected the type is told alone, and validity selects after that.
+    NetProxy other;
+    settle();
+    SignalSequence otherSeen(&other);
+    propertyChanged("Configuration", QVariantMap());
+    QCOMPARE(otherSeen.take(), QStringList());
+    propertyChanged("Active", true);
+    QCOMPARE(otherSeen.take(), list("activeTypeChanged(Global)|validChanged(true)"));
+    QCOMPARE(other.getIdentifier(), Global);
+    QCOMPARE(other.type(), NetProxy::Direct);
 }
 
 void NetProxyTest::withoutTheConnectionManager()
@@ -327,6 +417,24 @@ void NetProxyTest::globalProxyThatCannotBeRead()
     QVERIFY(proxy.isValid());
     QCOMPARE(proxy.activeType(), NetProxy::Global);
     QCOMPARE(proxy.getIdentifier(), Global);
+}
+
+void NetProxyTest::globalProxyThatIsNoVariant()
+{
+    m_phone->answerCalls(Service, Root, QStringLiteral("GetProperty"), {true});
+    for (const char *message : {"^MDM Proxy: error:  ", "^MDM Proxy: global proxy proxy error:  "}) {
+        QTest::ignoreMessage(
+            QtDebugMsg,
+            QRegularExpression(
+                QLatin1String(message)
+                + QStringLiteral("QDBusError\\(\"org.freedesktop.DBus.Error.InvalidSignature\", ")));
+    }
+    NetProxy proxy;
+    SignalSequence seen(&proxy);
+    settle();
+    QVERIFY(!proxy.isValid());
+    QCOMPARE(proxy.activeType(), NetProxy::Service);
+    QCOMPARE(seen.take(), QStringList());
 }
 
 void NetProxyTest::selectsAndUnselects()
@@ -727,6 +835,43 @@ void NetProxyTest::networkThatIsNotReadyIsSilent()
                         {services({}), WireObject::paths({Prefix + strange})});
 }
 
+void NetProxyTest::networkThatBecomesReadyIsSilent()
+{
+    const QString strange = QStringLiteral("wifi_slow");
+    const QString path = Prefix + strange;
+    const QString getProperties = QStringLiteral("GetProperties");
+    const auto listIt = [&] {
+        m_phone->emitSignal(Service, Root, ManagerInterface, QStringLiteral("ServicesChanged"),
+                            {WireObject::list(Prefix, {{strange, {{QStringLiteral("Favorite"), true}}}}),
+                             WireObject::paths({})});
+    };
+    const auto proxy = selected(Global);
+    m_phone->swallowCalls(Service, path, getProperties);
+    listIt();
+    QVERIFY(proxy->selectProxy(strange));
+    QCOMPARE(proxy->type(), NetProxy::Direct); // as of a network that tells nothing of it
+    SignalSequence seen(proxy.get());
+    // The next list asks for its properties anew.
+    m_phone->clearFaults();
+    m_phone->answerCalls(
+        Service, path, getProperties,
+        {QVariantMap{{QStringLiteral("Name"), QStringLiteral("Slow")},
+                     {QStringLiteral("Proxy.Configuration"),
+                      QVariantMap{{QStringLiteral("Method"), QStringLiteral("auto")},
+                                  {QStringLiteral("URL"), QStringLiteral("http://slow")}}}}});
+    listIt();
+    QVERIFY(waitUntil([&] { return proxy->getName() == QLatin1String("Slow"); }));
+    settle();
+    QCOMPARE(proxy->automaticUrl(), QUrl(QStringLiteral("http://slow")));
+    QCOMPARE(seen.take(), QStringList());
+    m_phone->emitSignal(
+        Service, path, ServiceInterface, PropertyChanged,
+        {QStringLiteral("Proxy.Configuration"), QVariant::fromValue(QDBusVariant(QVariantMap()))});
+    QCOMPARE(seen.take(), list("proxyConfigChanged()|typeChanged(Direct)"));
+    m_phone->emitSignal(Service, Root, ManagerInterface, QStringLiteral("ServicesChanged"),
+                        {WireObject::list(Prefix, {}), WireObject::paths({path})});
+}
+
 void NetProxyTest::switchesTheActiveType()
 {
     const auto proxy = selected(Home);
@@ -742,6 +887,22 @@ void NetProxyTest::switchesTheActiveType()
     QVERIFY(proxy->selectProxy(Global));
     QVERIFY(proxy->setActiveType(NetProxy::Service));
     QVERIFY(seen.waitFor(2));
+    QCOMPARE(seen.take(), list("activeTypeChanged(Service)|proxyConfigChanged()"));
+}
+
+void NetProxyTest::refusedActiveType()
+{
+    const auto proxy = selected(Global);
+    SignalSequence seen(proxy.get());
+    m_phone->failCalls(Service, Root, QStringLiteral("SetProperty"),
+                       QStringLiteral("net.connman.Error.PermissionDenied"), QString());
+    QVERIFY(proxy->setActiveType(NetProxy::Global));
+    settle();
+    // Nobody looks at the answer: it stays so until something is announced.
+    QCOMPARE(proxy->activeType(), NetProxy::Global);
+    QCOMPARE(seen.take(), QStringList());
+    propertyChanged("Active", false);
+    QCOMPARE(proxy->activeType(), NetProxy::Service);
     QCOMPARE(seen.take(), list("activeTypeChanged(Service)|proxyConfigChanged()"));
 }
 

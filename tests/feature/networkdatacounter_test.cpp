@@ -40,6 +40,7 @@ private Q_SLOTS:
     void init();
     void cleanup();
 
+    void metaObject();
     void startsInactive();
     void invalidSettingsAreRefused();
     void settingsAreSignalledOnce();
@@ -48,12 +49,14 @@ private Q_SLOTS:
     void switchedOnWithoutTheConnectionManager();
     void isInactiveAfterARestart();
     void isReleased();
+    void releasedIsNotUnregistered();
     void unregistersAtItsEnd();
     void twoCountersAreIndependent();
 
     void countsTraffic();
     void reports_data();
     void reports();
+    void reportsWhileInactive();
     void resetsANetwork();
     void resetOfStrangePathsIsLogged();
 
@@ -118,6 +121,22 @@ QStringList NetworkDataCounterTest::registered() const
     for (const QJsonValue &counter : counters)
         paths.append(counter.toObject().value(QLatin1String("path")).toString());
     return paths;
+}
+
+void NetworkDataCounterTest::metaObject()
+{
+    const QMetaObject &meta = NetworkDataCounter::staticMetaObject;
+    for (const char *name : {"updateInterval", "updateAccuracy", "active"}) {
+        const QMetaProperty property = meta.property(meta.indexOfProperty(name));
+        QVERIFY2(property.isReadable() && property.isWritable(), name);
+        QCOMPARE(property.notifySignal().methodSignature(), QByteArray(name) + "Changed()");
+        QCOMPARE(int(property.userType()), int(qstrcmp(name, "active") ? QMetaType::Int : QMetaType::Bool));
+    }
+    const auto types = QMetaEnum::fromType<NetworkDataCounter::NetworkType>();
+    QCOMPARE(types.keyCount(), 3);
+    QCOMPARE(types.keyToValue("MobileDataHome"), 0);
+    QCOMPARE(types.keyToValue("MobileDataRoaming"), 1);
+    QCOMPARE(types.keyToValue("Wlan"), 2);
 }
 
 void NetworkDataCounterTest::startsInactive()
@@ -261,6 +280,20 @@ void NetworkDataCounterTest::isReleased()
     QVERIFY(!counter.active());
 }
 
+void NetworkDataCounterTest::releasedIsNotUnregistered()
+{
+    {
+        NetworkDataCounter counter;
+        counter.setActive(true);
+        settle();
+        act("counter release", {});
+        QVERIFY(waitUntil([&] { return !counter.active(); }));
+        counter.setActive(false);
+        registrations();
+    }
+    QCOMPARE(registrations(), QStringList());
+}
+
 void NetworkDataCounterTest::unregistersAtItsEnd()
 {
     {
@@ -377,6 +410,22 @@ void NetworkDataCounterTest::reports()
     for (QString &update : updates)
         update = update.mid(int(qstrlen("counterUpdate(")), update.size() - int(qstrlen("counterUpdate()")));
     QTEST(updates, "updates");
+}
+
+void NetworkDataCounterTest::reportsWhileInactive()
+{
+    NetworkDataCounter counter;
+    counter.setActive(true);
+    settle();
+    m_phone->swallowCalls(Service, QString(), QStringLiteral("UnregisterCounter"));
+    counter.setActive(false);
+    SignalSequence seen(&counter);
+    // What is still on its way counts.
+    act("counter usage",
+        {Prefix + Cellular, QStringLiteral("{'RX.Bytes': <uint64 2>}"), QStringLiteral("{}")});
+    settle();
+    QCOMPARE(seen.take().filter(Cellular),
+             QStringList(QStringLiteral("counterUpdate(%1 home tx:0 rx:2 time:0)").arg(Cellular)));
 }
 
 void NetworkDataCounterTest::resetsANetwork()

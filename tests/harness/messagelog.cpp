@@ -20,16 +20,19 @@ MessageLog::~MessageLog()
 
 QStringList MessageLog::takeWarnings()
 {
+    const QMutexLocker lock(&m_mutex);
     return std::exchange(m_warnings, {});
 }
 
 QStringList MessageLog::takeInfos()
 {
+    const QMutexLocker lock(&m_mutex);
     return std::exchange(m_infos, {});
 }
 
 void MessageLog::handle(QtMsgType type, const QMessageLogContext &context, const QString &message)
 {
+    const QMutexLocker lock(&s_current->m_mutex);
     if (type == QtWarningMsg)
         s_current->m_warnings.append(message);
     else if (type == QtInfoMsg)

@@ -2,10 +2,11 @@
 #ifndef CORVANE_TEST_MESSAGELOG_H
 #define CORVANE_TEST_MESSAGELOG_H
 
+#include <QtCore/QMutex>
 #include <QtCore/QStringList>
 #include <QtCore/QtGlobal>
 
-/** Collects what is logged while it lives, instead of printing it. One at a time. */
+/** Collects what is logged while it lives, in any thread, instead of printing it. One at a time. */
 class MessageLog
 {
 public:
@@ -24,6 +25,7 @@ private:
 
     static MessageLog *s_current;
     QtMessageHandler m_previous;
+    QMutex m_mutex;
     QStringList m_warnings;
     QStringList m_infos;
 };
