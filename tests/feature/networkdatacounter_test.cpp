@@ -196,9 +196,8 @@ void NetworkDataCounterTest::registersWhileActive()
              list("/ UnregisterCounter (objectpath "
                   "'/org/veldmobile/systemsettings/NetworkDataCounter_N',)"));
     QCOMPARE(registered().size(), 0);
-    QStringList signalsSeen = seen.take();
-    signalsSeen.removeAll(signalsSeen.filter(QStringLiteral("counterUpdate")).value(0));
-    QCOMPARE(signalsSeen, list("activeChanged()|activeChanged()"));
+    // Of the connected network there are reports as well.
+    QCOMPARE(seen.take().filter(QStringLiteral("Changed()")), list("activeChanged()|activeChanged()"));
 }
 
 void NetworkDataCounterTest::newSettingsHoldFromTheNextRegistration()
