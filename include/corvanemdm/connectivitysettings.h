@@ -27,7 +27,8 @@ class ConnectivitySettingsPrivate;
  * client library, which does not; the mode of construction decides.
  *
  * Everything else blocks in either mode: each operation asks one question after the other, and each question
- * waits for its answer, for QtDBus's default timeout (25 s) at most. What fails is told by a warning and an
+ * waits for its answer, for QtDBus's default timeout (25 s) at most; when a service does not even describe
+ * its objects, the first question to one waits as long once more. What fails is told by a warning and an
  * empty or false result; nothing is retried or rolled back.
  *
  * SIMs are named by their IMSI, modems by the object path that the telephony service has for them.
