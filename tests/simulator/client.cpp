@@ -142,10 +142,10 @@ void Client::callAndNote(const QString &service, const QString &path, const QStr
 {
     QDBusMessage message = QDBusMessage::createMethodCall(service, path, interface, member);
     message.setArguments(arguments);
-    auto *watcher = new QDBusPendingCallWatcher(m_connection.asyncCall(message), this);
-    connect(watcher, &QDBusPendingCallWatcher::finished, this, [this](QDBusPendingCallWatcher *answered) {
-        m_signals << (answered->isError() ? answered->error().name() : QStringLiteral("answer"));
-    });
+    // Not with a watcher: when the answer is there before the watcher is, it tells of it one turn of the
+    // event loop late, after signals that came later.
+    if (!m_connection.callWithCallback(message, this, SLOT(noteAnswer()), SLOT(noteError(QDBusError))))
+        qFatal("cannot call %s", qPrintable(member));
 }
 
 void Client::watch(const QString &service, const QString &path, const QString &interface,
@@ -179,6 +179,16 @@ QStringList Client::takeSignals(const QString &service)
 void Client::note(const QDBusMessage &signal)
 {
     m_signals << signal.member() + textOf(signal.arguments());
+}
+
+void Client::noteAnswer()
+{
+    m_signals << QStringLiteral("answer");
+}
+
+void Client::noteError(const QDBusError &error)
+{
+    m_signals << error.name();
 }
 
 QVariant boxed(const QVariantList &values)

@@ -7,6 +7,7 @@
 #include <QtCore/QVariantList>
 #include <QtDBus/QDBusArgument>
 #include <QtDBus/QDBusConnection>
+#include <QtDBus/QDBusError>
 #include <QtDBus/QDBusMessage>
 
 /** A rule as the wire has it. */
@@ -59,6 +60,8 @@ public:
 
 private Q_SLOTS:
     void note(const QDBusMessage &signal);
+    void noteAnswer();
+    void noteError(const QDBusError &error);
 
 private:
     const QString m_connectionName; ///< empty: shared
