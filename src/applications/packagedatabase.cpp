@@ -46,9 +46,11 @@ QString textOf(Header header, rpmTagVal tag, const char *missing = nullptr)
 
 PackageEntry entryOf(Header header)
 {
-    return PackageEntry(textOf(header, RPMTAG_NAME, "rpm headerGet failed for name"),
-                        textOf(header, RPMTAG_VERSION, "rpm headerGet failed for version"),
-                        textOf(header, RPMTAG_VENDOR));
+    // Not as arguments, which compilers evaluate in any order, and the warnings with them.
+    const QString name = textOf(header, RPMTAG_NAME, "rpm headerGet failed for name");
+    const QString version = textOf(header, RPMTAG_VERSION, "rpm headerGet failed for version");
+    const QString vendor = textOf(header, RPMTAG_VENDOR);
+    return PackageEntry(name, version, vendor);
 }
 
 } // namespace

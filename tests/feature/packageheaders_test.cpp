@@ -6,13 +6,16 @@
 #include <QtCore/QFile>
 #include <QtTest/QtTest>
 
+#include <dlfcn.h>
 #include <fcntl.h>
 #include <rpm/header.h>
 #include <rpm/rpmdb.h>
 #include <rpm/rpmlib.h>
+#include <rpm/rpmtd.h>
 #include <rpm/rpmts.h>
 
 #include <functional>
+#include <utility>
 
 using Corvane::Mdm::ApplicationEntry;
 using Corvane::Mdm::Applications;
@@ -43,6 +46,22 @@ void addHeader(const std::function<void(Header)> &fill)
     rpmtsFree(transactions);
 }
 
+/** Gives @p header a number where a text belongs. */
+void putNumber(Header header, rpmTagVal tag)
+{
+    uint32_t number = 7;
+    rpmtd_s data = {};
+    data.tag = tag;
+    data.type = RPM_INT32_TYPE;
+    data.data = &number;
+    data.count = 1;
+    if (!headerPut(header, &data, HEADERPUT_DEFAULT))
+        qFatal("the header cannot be given a number");
+}
+
+/** What the next search of the database finds in place of the first header that is there, if it is given. */
+Header damagedHeader = nullptr;
+
 QString textOf(const PackageEntry &package)
 {
     return QStringList({package.name(), package.version(), package.vendor()}).join(QLatin1Char('|'));
@@ -57,6 +76,16 @@ extern "C" const char *__lsan_default_suppressions()
     return "leak:libsqlite3";
 }
 
+// This librpm passes over headers that are damaged, others do not. The library finds this function before
+// librpm's.
+extern "C" Q_DECL_EXPORT Header rpmdbNextIterator(rpmdbMatchIterator iterator)
+{
+    static const auto next
+        = reinterpret_cast<Header (*)(rpmdbMatchIterator)>(dlsym(RTLD_NEXT, "rpmdbNextIterator"));
+    const Header found = next(iterator);
+    return found && damagedHeader ? std::exchange(damagedHeader, nullptr) : found;
+}
+
 Q_DECLARE_METATYPE(std::function<void(Header)>)
 
 /** What the package database may hold that is not as it should be. */
@@ -69,6 +98,8 @@ private Q_SLOTS:
     void headers_data();
     void headers();
     void headerWithoutANameIsPassedOver();
+    void damagedHeaders_data();
+    void damagedHeaders();
     void ownerWithoutAVersion();
     void severalOwnersOfOneFile();
     void noDatabase();
@@ -138,6 +169,59 @@ void PackageHeadersTest::headerWithoutANameIsPassedOver()
     // For librpm such a header is damaged.
     addHeader([](Header header) { headerPutString(header, RPMTAG_VERSION, "2.0"); });
     QCOMPARE(Applications().getInstalledPackages().size(), m_known);
+}
+
+void PackageHeadersTest::damagedHeaders_data()
+{
+    using Fill = std::function<void(Header)>;
+    QTest::addColumn<Fill>("fill");
+    QTest::addColumn<QString>("package");
+    QTest::addColumn<QStringList>("warnings");
+    const QString noName = QStringLiteral("rpm headerGet failed for name");
+    const QString noVersion = QStringLiteral("rpm headerGet failed for version");
+    const QString noText = QStringLiteral("RPM header didn't return string as expected");
+    const auto put = [](Header header, rpmTagVal tag, const char *text) {
+        headerPutString(header, tag, text);
+    };
+    QTest::newRow("no name") << Fill([put](Header header) {
+        put(header, RPMTAG_VERSION, "1.0");
+        put(header, RPMTAG_VENDOR, "Acme");
+    }) << "|1.0|Acme" << QStringList(noName);
+    QTest::newRow("nothing") << Fill([](Header) {}) << "||" << QStringList({noName, noVersion});
+    QTest::newRow("name that is no text") << Fill([put](Header header) {
+        putNumber(header, RPMTAG_NAME);
+        put(header, RPMTAG_VERSION, "1.0");
+    }) << "|1.0|" << QStringList(noText);
+    QTest::newRow("version that is no text") << Fill([put](Header header) {
+        put(header, RPMTAG_NAME, "odd");
+        putNumber(header, RPMTAG_VERSION);
+        put(header, RPMTAG_VENDOR, "Acme");
+    }) << "odd||Acme" << QStringList(noText);
+    QTest::newRow("vendor that is no text") << Fill([put](Header header) {
+        put(header, RPMTAG_NAME, "odd");
+        put(header, RPMTAG_VERSION, "1.0");
+        putNumber(header, RPMTAG_VENDOR);
+    }) << "odd|1.0|" << QStringList(noText);
+}
+
+void PackageHeadersTest::damagedHeaders()
+{
+    QFETCH(std::function<void(Header)>, fill);
+    QFETCH(QString, package);
+    QFETCH(QStringList, warnings);
+    const Header header = headerNew();
+    fill(header);
+    // The other packages have warnings of their own.
+    MessageLog log;
+    const Applications applications;
+    applications.getInstalledPackages();
+    const QStringList ofTheOthers = log.takeWarnings();
+    damagedHeader = header;
+    const QList<PackageEntry> packages = applications.getInstalledPackages();
+    QCOMPARE(log.takeWarnings(), warnings + ofTheOthers);
+    headerFree(header);
+    QCOMPARE(packages.size(), m_known);
+    QCOMPARE(textOf(packages.first()), package);
 }
 
 void PackageHeadersTest::ownerWithoutAVersion()
