@@ -11,8 +11,10 @@
 #include <QtDBus/QDBusMetaType>
 #include <QtTest/QtTest>
 
+#include <cstring>
 #include <limits>
 #include <memory>
+#include <type_traits>
 
 using namespace Corvane::Mdm::Accounts;
 using AccountInfo = Provisioner::AccountInfo;
@@ -54,6 +56,21 @@ QVariant wire(const QList<WireAccount> &accounts)
     return QVariant::fromValue(accounts);
 }
 
+/** Which entry of the table of virtual functions @p function stands for. */
+template <typename Function> std::size_t slotOf(Function function)
+{
+    // What such a pointer begins with is the entry's offset; some systems mark that in its lowest bit.
+    std::size_t offset = 0;
+    static_assert(sizeof function >= sizeof offset);
+    std::memcpy(&offset, &function, sizeof offset);
+    return offset / sizeof(void *);
+}
+
+/** The last virtual function of QObject is for those who derive from it. */
+struct Derived : public QObject {
+    using QObject::disconnectNotify;
+};
+
 QString text(const QList<AccountInfo> &accounts)
 {
     QStringList texts;
@@ -84,6 +101,8 @@ private Q_SLOTS:
     void theAnswerIsComparedAfterTheSettersSignal();
     void deletionInASlot();
     void worksThroughTheMetaObject();
+    void virtualFunctionsKeepTheirOrder();
+    void kindsAreReachedThroughTheBase();
 
     void listsInTheServicesOrder();
     void listCarriesTheServicesTextAndCode();
@@ -273,6 +292,32 @@ void ProvisionerTest::worksThroughTheMetaObject()
     QCOMPARE(meta.indexOfMethod("listAccounts()"), -1);
     QCOMPARE(meta.indexOfMethod("deleteAccount(quint64)"), -1);
     QCOMPARE(meta.indexOfMethod("createAccount()"), -1);
+}
+
+void ProvisionerTest::virtualFunctionsKeepTheirOrder()
+{
+    // Agents were compiled with these numbers.
+    const std::size_t last = slotOf(&Derived::disconnectNotify);
+    QCOMPARE(slotOf(&Provisioner::createAccount), last + 1);
+    QCOMPARE(slotOf(&Provisioner::deleteAccount), last + 2);
+    QCOMPARE(slotOf(&Provisioner::listAccounts), last + 3);
+    // The kinds answer in the same place.
+    QCOMPARE(slotOf(&EmailAccountProvisioner::createAccount), last + 1);
+    QCOMPARE(slotOf(&GenericAccountProvisioner::createAccount), last + 1);
+}
+
+void ProvisionerTest::kindsAreReachedThroughTheBase()
+{
+    EmailAccountProvisioner email;
+    GenericAccountProvisioner generic;
+    for (Provisioner *provisioner : std::initializer_list<Provisioner *>{&email, &generic}) {
+        provisioner->setProviderName(QStringLiteral("p"));
+        QVERIFY(!provisioner->createAccount());
+        QCOMPARE(provisioner->errorMessage(),
+                 QStringLiteral("One or more required settings have not been provided"));
+    }
+    static_assert(std::is_abstract<Provisioner>::value, "only kinds of accounts can be made");
+    static_assert(std::has_virtual_destructor<Provisioner>::value, "kinds are deleted as provisioners");
 }
 
 void ProvisionerTest::listsInTheServicesOrder()
