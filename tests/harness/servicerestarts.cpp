@@ -33,12 +33,17 @@ void ServiceRestarts::stop()
     m_phone.stopService(m_service);
 }
 
+void ServiceRestarts::runOn()
+{
+    passTime(m_longestRun);
+}
+
 void ServiceRestarts::runBriefly()
 {
     passTime(m_longestRun / 4);
     m_phone.startService(m_service);
     ++m_restarts;
-    passTime(m_longestRun);
+    runOn();
     m_phone.stopService(m_service);
     // What the run has left behind arrives now, and not with the next one.
     passTime(m_longestRun / 4);

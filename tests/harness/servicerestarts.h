@@ -16,8 +16,8 @@
 class ServiceRestarts
 {
 public:
-    /** @p longestRun is somewhat more than clients need until they know all of the service, in microseconds.
-     */
+    /** @p longestRun is somewhat more than clients need until they know all of the service, or have done with
+     * it what they do in a round, in microseconds. */
     ServiceRestarts(Phone &phone, const QString &service, int longestRun);
 
     /** Each of them has two restarts. */
@@ -25,6 +25,8 @@ public:
 
     /** The service goes away for a while. */
     void stop();
+    /** It runs on for as long as it may take until all is done, or any shorter time. */
+    void runOn();
     /** It comes, and goes away again at any point of being taken up by its clients. */
     void runBriefly();
     /** It comes to stay. */
