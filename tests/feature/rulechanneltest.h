@@ -8,6 +8,7 @@
 
 #include <QtCore/QObject>
 #include <QtCore/QVector>
+#include <QtDBus/QDBusArgument>
 
 #include <functional>
 #include <memory>
@@ -22,6 +23,8 @@ struct WireRule {
     quint32 action = 0;
 };
 Q_DECLARE_METATYPE(WireRule)
+QDBusArgument &operator<<(QDBusArgument &out, const WireRule &rule);
+const QDBusArgument &operator>>(const QDBusArgument &in, WireRule &rule);
 
 QVariant wire(const char *imsi, quint32 action);
 QVariant wire(const QList<WireRule> &rules);
