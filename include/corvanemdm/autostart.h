@@ -62,7 +62,7 @@ public:
      * asked.
      * @return empty also when the proxy could not be asked.
      */
-    QStringList query(Result &result);
+    QStringList query(Result &result) const;
 
 private:
     Q_DISABLE_COPY(Autostart)

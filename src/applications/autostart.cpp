@@ -70,7 +70,7 @@ Autostart::Result Autostart::remove(const QString &desktopFile)
                       "Got invalid reply to Autostart::remove, error is:");
 }
 
-QStringList Autostart::query(Result &result)
+QStringList Autostart::query(Result &result) const
 {
     return d->query(result);
 }

@@ -194,7 +194,8 @@ void AutostartTest::listKeepsTheServicesOrder()
     const QStringList entries{QStringLiteral("z"), QStringLiteral("a"), QString(), QStringLiteral("a")};
     m_phone->answerCalls(Service, Path, QStringLiteral("query"), {entries});
     Autostart::Result result = Autostart::InternalError;
-    QCOMPARE(Autostart().query(result), entries);
+    const Autostart autostart;
+    QCOMPARE(autostart.query(result), entries);
     QCOMPARE(result, Autostart::Success);
 }
 
