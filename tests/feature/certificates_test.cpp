@@ -124,7 +124,9 @@ private Q_SLOTS:
     void helperThatCannotBeStarted_data();
     void helperThatCannotBeStarted();
     void runInvalidatesWhatWasRead();
+    void failedStartKeepsWhatWasRead();
     void fileOfARequestIsTheListedOne();
+    void requestsDoNotReadTheFolder();
     void realHelperInstallsAndUninstalls();
     void realHelperBlacklistsAndUnblacklists();
     void realHelperRefuses_data();
@@ -650,6 +652,66 @@ void CertificatesTest::fileOfARequestIsTheListedOne()
     TrustStore::OpenCounter opened(Anchors);
     QCOMPARE(listed.certificates().size(), 1);
     QCOMPARE(opened.take(), 0);
+}
+
+void CertificatesTest::failedStartKeepsWhatWasRead()
+{
+    TrustStore::write(Anchors + QLatin1Char('/') + FileName, TrustStore::authority("elo-mobile"));
+    QVERIFY(QFile::remove(Helper));
+    Certificates certificates;
+    const CertificateFile file = certificates.installedFiles().constFirst();
+    QCOMPARE(file.certificates().size(), 1);
+    QSignalSpy finished(&certificates, &Certificates::uninstallFinished);
+    certificates.uninstall(FileName);
+    QVERIFY(waitUntil([&] { return !finished.isEmpty(); }));
+    TrustStore::OpenCounter opened(Anchors);
+    QCOMPARE(file.certificates().size(), 1);
+    QCOMPARE(opened.take(), 0);
+    QCOMPARE(takeWarnings(), QStringList(BrokenStart));
+}
+
+void CertificatesTest::requestsDoNotReadTheFolder()
+{
+    TrustStore::write(Anchors + QLatin1Char('/') + FileName, TrustStore::authority("elo-mobile"));
+    replaceHelper("exit 0");
+    Certificates certificates;
+    CertificateFile told;
+    const auto take = [&told](const CertificateFile &file) {
+        told = file;
+    };
+    connect(&certificates, &Certificates::uninstallFinished, this, take);
+    connect(&certificates, &Certificates::unblacklistFinished, this, take);
+    const auto fileOf = [&](void (Certificates::*request)(const QString &)) {
+        told = CertificateFile();
+        (certificates.*request)(FileName);
+        waitUntil([&] { return !told.isNull(); });
+        return told;
+    };
+    // Nobody has asked for the list, so that there is none to look at.
+    TrustStore::OpenCounter opened(Anchors);
+    const CertificateFile unlisted = fileOf(&Certificates::uninstall);
+    QCOMPARE(opened.take(), 0);
+    QCOMPARE(unlisted.fileName(), FileName);
+    QCOMPARE(unlisted.certificates().size(), 1);
+
+    // The list as it stands, also when it is not true any more.
+    const CertificateFile listed = certificates.installedFiles().constFirst();
+    QVERIFY(QFile::remove(Anchors + QLatin1Char('/') + FileName));
+    QSignalSpy changed(&certificates, &Certificates::installedFilesChanged);
+    QVERIFY(waitUntil([&] { return !changed.isEmpty(); }));
+    opened.take();
+    const CertificateFile gone = fileOf(&Certificates::uninstall);
+    QCOMPARE(opened.take(), 0);
+    TrustStore::write(Anchors + QLatin1Char('/') + FileName, TrustStore::authority("elo-mobile"));
+    QCOMPARE(gone.certificates().size(), 1);
+    opened.take();
+    QCOMPARE(listed.certificates().size(), 1);
+    QCOMPARE(opened.take(), 0);
+
+    // A file of that name in the other folder is another file.
+    const CertificateFile other = fileOf(&Certificates::unblacklist);
+    QCOMPARE(other.fileName(), FileName);
+    QCOMPARE(other.certificates().size(), 0);
 }
 
 void CertificatesTest::realHelperInstallsAndUninstalls()
