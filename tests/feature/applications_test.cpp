@@ -278,6 +278,8 @@ void ApplicationsTest::iconsOfApplications_data()
     QTest::addColumn<QByteArray>("icon");
     QTest::addColumn<QString>("path");
     QTest::newRow("path of a file") << QByteArray("/usr/share/extra/icon") << "/usr/share/extra/icon";
+    QTest::newRow("path with a detour")
+        << QByteArray("/usr/share/../share/extra/icon") << "/usr/share/../share/extra/icon";
     QTest::newRow("path of nothing") << QByteArray("/usr/share/extra/nothing.png") << "";
     QTest::newRow("path of a folder") << QByteArray("/usr/share/extra") << "";
     QTest::newRow("name") << QByteArray("notes") << "/usr/share/icons/hicolor/128x128/apps/notes.png";

@@ -100,6 +100,7 @@ private Q_SLOTS:
     void listsOtherNamesAndKindsNot();
     void oddContent_data();
     void oddContent();
+    void namesAreNoPatterns();
     void severalCertificates();
     void hugeFiles();
     void copiesShareWhatWasRead();
@@ -281,6 +282,20 @@ void CertificatesTest::oddContent()
     const Certificates certificates;
     QCOMPARE(names(certificates.installedFiles()), QStringList(QStringLiteral("odd.crt")));
     QCOMPARE(certificates.installedFiles().constFirst().certificates().size(), 0);
+}
+
+void CertificatesTest::namesAreNoPatterns()
+{
+    TrustStore::write(Anchors + QLatin1String("/a*.crt"), TrustStore::authority("elo-mobile"));
+    TrustStore::write(Anchors + QLatin1String("/ab.crt"), TrustStore::authority("open-trust"));
+    TrustStore::write(Anchors + QLatin1String("/a[b].crt"), TrustStore::authority("corvane-root"));
+    const Certificates certificates;
+    const QList<CertificateFile> files = certificates.installedFiles();
+    QCOMPARE(names(files),
+             QStringList({QStringLiteral("a*.crt"), QStringLiteral("a[b].crt"), QStringLiteral("ab.crt")}));
+    QCOMPARE(files.at(0).certificates(), parsed(TrustStore::authority("elo-mobile")));
+    QCOMPARE(files.at(1).certificates(), parsed(TrustStore::authority("corvane-root")));
+    QCOMPARE(files.at(2).certificates(), parsed(TrustStore::authority("open-trust")));
 }
 
 void CertificatesTest::severalCertificates()

@@ -62,6 +62,8 @@ void putNumber(Header header, rpmTagVal tag)
 /** What the next search of the database finds in place of the first header that is there, if it is given. */
 Header damagedHeader = nullptr;
 
+int configurationsRead = 0;
+
 QString textOf(const PackageEntry &package)
 {
     return QStringList({package.name(), package.version(), package.vendor()}).join(QLatin1Char('|'));
@@ -86,6 +88,17 @@ extern "C" Q_DECL_EXPORT Header rpmdbNextIterator(rpmdbMatchIterator iterator)
     return found && damagedHeader ? std::exchange(damagedHeader, nullptr) : found;
 }
 
+// The same, to see how often rpm's configuration is read.
+extern "C" Q_DECL_EXPORT int rpmReadConfigFiles(const char *file, const char *target)
+{
+    if (file || target)
+        qFatal("it is not the default configuration of rpm that is read");
+    ++configurationsRead;
+    static const auto next
+        = reinterpret_cast<int (*)(const char *, const char *)>(dlsym(RTLD_NEXT, "rpmReadConfigFiles"));
+    return next(file, target);
+}
+
 Q_DECLARE_METATYPE(std::function<void(Header)>)
 
 /** What the package database may hold that is not as it should be. */
@@ -95,6 +108,7 @@ class PackageHeadersTest : public QObject
 
 private Q_SLOTS:
     void initTestCase();
+    void configurationIsReadOnce();
     void headers_data();
     void headers();
     void headerWithoutANameIsPassedOver();
@@ -111,8 +125,18 @@ private:
 
 void PackageHeadersTest::initTestCase()
 {
+    // Not when the library is loaded, and not with each object.
+    QCOMPARE(configurationsRead, 0);
     m_known = Applications().getInstalledPackages().size();
     QVERIFY(m_known > 0);
+}
+
+void PackageHeadersTest::configurationIsReadOnce()
+{
+    QCOMPARE(configurationsRead, 1);
+    const Applications another;
+    QCOMPARE(another.getInstalledPackages().size(), m_known);
+    QCOMPARE(configurationsRead, 1);
 }
 
 void PackageHeadersTest::headers_data()
