@@ -289,13 +289,23 @@ void CertificatesTest::namesAreNoPatterns()
     TrustStore::write(Anchors + QLatin1String("/a*.crt"), TrustStore::authority("elo-mobile"));
     TrustStore::write(Anchors + QLatin1String("/ab.crt"), TrustStore::authority("open-trust"));
     TrustStore::write(Anchors + QLatin1String("/a[b].crt"), TrustStore::authority("corvane-root"));
-    const Certificates certificates;
+    Certificates certificates;
     const QList<CertificateFile> files = certificates.installedFiles();
     QCOMPARE(names(files),
              QStringList({QStringLiteral("a*.crt"), QStringLiteral("a[b].crt"), QStringLiteral("ab.crt")}));
     QCOMPARE(files.at(0).certificates(), parsed(TrustStore::authority("elo-mobile")));
     QCOMPARE(files.at(1).certificates(), parsed(TrustStore::authority("corvane-root")));
     QCOMPARE(files.at(2).certificates(), parsed(TrustStore::authority("open-trust")));
+
+    // One that is not there stands for no others either.
+    replaceHelper("exit 0");
+    CertificateFile missing;
+    connect(&certificates, &Certificates::uninstallFinished, this,
+            [&missing](const CertificateFile &file) { missing = file; });
+    certificates.uninstall(QStringLiteral("*b.crt"));
+    QVERIFY(waitUntil([&] { return !missing.isNull(); }));
+    QCOMPARE(missing.fileName(), QStringLiteral("*b.crt"));
+    QCOMPARE(missing.certificates().size(), 0);
 }
 
 void CertificatesTest::severalCertificates()
