@@ -21,7 +21,8 @@ namespace
 {
 
 const QString Service = QStringLiteral("org.freedesktop.PackageKit");
-constexpr int LongestRunMicroseconds = 150000; // somewhat longer than until the first ones have succeeded
+constexpr int LongestRunMicroseconds = 250000; // longer than until the first ones have succeeded
+constexpr int UsualRounds = 30; // a round has much to do
 
 /** How operations ended. */
 struct Ends {
@@ -84,7 +85,7 @@ bool PackageRestartsTest::waitForTheEnds()
 void PackageRestartsTest::everyOperationEndsOnce()
 {
     Phone phone;
-    ServiceRestarts restarts(phone, Service, LongestRunMicroseconds);
+    ServiceRestarts restarts(phone, Service, LongestRunMicroseconds, UsualRounds);
     auto log = std::make_unique<MessageLog>();
     // Of thousands of failures, nobody reads the reasons.
     QLoggingCategory::defaultCategory()->setEnabled(QtDebugMsg, false);

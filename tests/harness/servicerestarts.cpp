@@ -6,7 +6,6 @@
 namespace
 {
 
-constexpr int usualRounds = 100;
 constexpr quint32 usualSeed = 20261121;
 
 int numberFromEnvironment(const char *name, int usual)
@@ -18,7 +17,7 @@ int numberFromEnvironment(const char *name, int usual)
 
 } // namespace
 
-ServiceRestarts::ServiceRestarts(Phone &phone, const QString &service, int longestRun)
+ServiceRestarts::ServiceRestarts(Phone &phone, const QString &service, int longestRun, int usualRounds)
     : m_phone(phone)
     , m_service(service)
     , m_longestRun(longestRun)

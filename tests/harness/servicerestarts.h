@@ -18,7 +18,7 @@ class ServiceRestarts
 public:
     /** @p longestRun is somewhat more than clients need until they know all of the service, or have done with
      * it what they do in a round, in microseconds. */
-    ServiceRestarts(Phone &phone, const QString &service, int longestRun);
+    ServiceRestarts(Phone &phone, const QString &service, int longestRun, int usualRounds = 100);
 
     /** Each of them has two restarts. */
     int rounds() const { return m_rounds; }
