@@ -24,10 +24,15 @@ namespace
 const QString DeviceLockService = QStringLiteral("org.veldmobile.devicelock");
 const QString ManagementPath = QStringLiteral("/mdm");
 const QString ChangeSetting = QStringLiteral("ChangeSetting");
+const QString PackageService = QStringLiteral("org.freedesktop.PackageKit");
+const QString DeveloperProgram = QStringLiteral("/usr/bin/devel-su");
 const QString SettingsFile = QStringLiteral("/usr/share/dapple/devicelock/devicelock_settings.conf");
 
 const QString fetchFailed = QStringLiteral("Unable to fetch sideloading key ");
 const QString changeFailed = QStringLiteral("Failed to change sideloading state QDBusError(\"");
+
+const QString enabledChanged = QStringLiteral("developerModeEnabledChanged()");
+const QString changeError = QStringLiteral("developerModeChangeError()");
 
 void writeSettings(const QByteArray &text)
 {
@@ -63,9 +68,19 @@ private Q_SLOTS:
     void sideloadingWithoutTheDaemon();
     void connectionIsMadeWhenItIsNeeded();
 
+    void developerModeComesAndGoes();
+    void developerModeThatIsInForceIsNothing();
+    void refusedDeveloperMode_data();
+    void refusedDeveloperMode();
+    void developerModeIsAskedForTwice();
+    void developerModeWithoutThePackageService();
+    void destructionWhileDeveloperModeChanges();
     void otherPackagesAreIgnored();
 
 private:
+    /** What the package service is asked to do, as "Method arguments". */
+    QStringList packageCalls() const;
+
     std::unique_ptr<Phone> m_phone;
     QByteArray m_settings;
 };
@@ -80,7 +95,15 @@ void SecuritySettingsTest::init()
 void SecuritySettingsTest::cleanup()
 {
     m_phone->clearFaults();
-    m_phone->startService(DeviceLockService);
+    for (const QString &service : {DeviceLockService, PackageService})
+        m_phone->startService(service);
+    SecuritySettings settings;
+    if (settings.developerModeEnabled()) {
+        SignalSequence seen(&settings);
+        settings.setDeveloperModeEnabled(false);
+        QVERIFY(seen.waitFor(1));
+        QCOMPARE(seen.take(), QStringList(enabledChanged));
+    }
     writeSettings(m_settings);
 }
 
@@ -247,6 +270,157 @@ void SecuritySettingsTest::connectionIsMadeWhenItIsNeeded()
     QCOMPARE(highest(), first);
 }
 
+QStringList SecuritySettingsTest::packageCalls() const
+{
+    QStringList calls;
+    const QStringList journal = m_phone->takeJournal(PackageService);
+    for (const QString &call : journal) {
+        const QString method = call.section(QLatin1Char(' '), 1);
+        for (const char *wanted : {"InstallPackages", "RemovePackages", "Resolve"}) {
+            if (method.startsWith(QLatin1String(wanted)))
+                calls << method;
+        }
+    }
+    return calls;
+}
+
+void SecuritySettingsTest::developerModeComesAndGoes()
+{
+    SecuritySettings settings;
+    SignalSequence seen(&settings);
+    MessageLog log;
+    for (int times = 0; times < 2; ++times) {
+        QVERIFY(!settings.developerModeEnabled());
+        packageCalls();
+        settings.setDeveloperModeEnabled(true);
+        // Nothing blocks, and nothing is told before it is so.
+        QCOMPARE(seen.take(), QStringList());
+        QVERIFY(seen.waitFor(1));
+        QVERIFY(settings.developerModeEnabled());
+        QCOMPARE(seen.take(), QStringList(enabledChanged));
+        QCOMPARE(packageCalls(),
+                 QStringList({QStringLiteral("Resolve (uint64 65536, ['tevrik-developer-mode'])"),
+                              QStringLiteral("InstallPackages (uint64 2, "
+                                             "['tevrik-developer-mode;0.9.2-1;noarch;store'])")}));
+
+        settings.setDeveloperModeEnabled(false);
+        QVERIFY(seen.waitFor(1));
+        QVERIFY(!settings.developerModeEnabled());
+        QCOMPARE(seen.take(), QStringList(enabledChanged));
+        // What came along with it goes along, and nothing that needs it.
+        QCOMPARE(packageCalls(),
+                 QStringList({QStringLiteral("Resolve (uint64 4, ['tevrik-developer-mode'])"),
+                              QStringLiteral("RemovePackages (uint64 2, "
+                                             "['tevrik-developer-mode;0.9.2-1;noarch;installed'], "
+                                             "false, true)")}));
+    }
+    QCOMPARE(log.takeWarnings(), QStringList());
+}
+
+void SecuritySettingsTest::developerModeThatIsInForceIsNothing()
+{
+    SecuritySettings settings;
+    SignalSequence seen(&settings);
+    const auto isNothing = [&](bool enabled) {
+        m_phone->takeJournal(PackageService);
+        settings.setDeveloperModeEnabled(enabled);
+        m_phone->settle(PackageService);
+        return m_phone->takeJournal(PackageService).isEmpty() && seen.take().isEmpty();
+    };
+    QVERIFY(isNothing(false));
+    // The program alone makes the mode, however it got there.
+    QFile program(DeveloperProgram);
+    QVERIFY(program.open(QIODevice::WriteOnly));
+    program.close();
+    QVERIFY(settings.developerModeEnabled());
+    QVERIFY(isNothing(true));
+    QVERIFY(program.remove());
+    QVERIFY(!settings.developerModeEnabled());
+}
+
+void SecuritySettingsTest::refusedDeveloperMode_data()
+{
+    QTest::addColumn<QString>("method");
+    QTest::addColumn<bool>("enable");
+    QTest::newRow("not found") << QStringLiteral("Resolve") << true;
+    QTest::newRow("not installed") << QStringLiteral("InstallPackages") << true;
+    QTest::newRow("not removed") << QStringLiteral("RemovePackages") << false;
+}
+
+void SecuritySettingsTest::refusedDeveloperMode()
+{
+    QFETCH(QString, method);
+    QFETCH(bool, enable);
+    SecuritySettings settings;
+    SignalSequence seen(&settings);
+    if (!enable) {
+        settings.setDeveloperModeEnabled(true);
+        QVERIFY(seen.waitFor(1));
+        seen.take();
+    }
+    m_phone->failCalls(PackageService, QString(), method, QStringLiteral("com.example.Broken"), QString());
+    const MessageLog log;
+    settings.setDeveloperModeEnabled(enable);
+    QVERIFY(seen.waitFor(1));
+    QCOMPARE(seen.take(), QStringList(changeError));
+    QCOMPARE(settings.developerModeEnabled(), !enable);
+
+    m_phone->clearFaults();
+    settings.setDeveloperModeEnabled(enable);
+    QVERIFY(seen.waitFor(1));
+    QCOMPARE(seen.take(), QStringList(enabledChanged));
+    QCOMPARE(settings.developerModeEnabled(), enable);
+}
+
+void SecuritySettingsTest::developerModeIsAskedForTwice()
+{
+    SecuritySettings settings;
+    SignalSequence seen(&settings);
+    MessageLog log;
+    settings.setDeveloperModeEnabled(true);
+    settings.setDeveloperModeEnabled(true);
+    // The second is refused at once: the package is being installed.
+    QVERIFY(seen.waitFor(2));
+    QCOMPARE(seen.take(), QStringList({changeError, enabledChanged}));
+    QCOMPARE(log.takeWarnings(),
+             QStringList(QStringLiteral("Trying to install package which is already being installed")));
+}
+
+void SecuritySettingsTest::developerModeWithoutThePackageService()
+{
+    m_phone->stopService(PackageService);
+    const MessageLog log;
+    SecuritySettings settings;
+    SignalSequence seen(&settings);
+    settings.setDeveloperModeEnabled(true);
+    QVERIFY(seen.waitFor(1));
+    QCOMPARE(seen.take(), QStringList(changeError));
+    QVERIFY(!settings.developerModeEnabled());
+    m_phone->startService(PackageService);
+    settings.setDeveloperModeEnabled(true);
+    QVERIFY(seen.waitFor(1));
+    QCOMPARE(seen.take(), QStringList(enabledChanged));
+}
+
+void SecuritySettingsTest::destructionWhileDeveloperModeChanges()
+{
+    m_phone->swallowCalls(PackageService, QString(), QStringLiteral("Resolve"));
+    const MessageLog log;
+    auto settings = std::make_unique<SecuritySettings>();
+    SignalSequence seen(settings.get());
+    settings->setDeveloperModeEnabled(true);
+    settings.reset();
+    QCOMPARE(seen.take(), QStringList());
+
+    // In the signal itself.
+    settings = std::make_unique<SecuritySettings>();
+    connect(settings.get(), &SecuritySettings::developerModeChangeError, this, [&] { settings.reset(); });
+    m_phone->failCalls(PackageService, QString(), QStringLiteral("Resolve"),
+                       QStringLiteral("com.example.Broken"), QString());
+    settings->setDeveloperModeEnabled(true);
+    QVERIFY(waitUntil([&] { return !settings; }));
+}
+
 void SecuritySettingsTest::otherPackagesAreIgnored()
 {
     SecuritySettings settings;
@@ -264,9 +438,7 @@ void SecuritySettingsTest::otherPackagesAreIgnored()
     QCOMPARE(seen.take(), QStringList());
     QVERIFY(checkPackage("tevrik-developer-mode", true));
     QVERIFY(checkPackage("tevrik-developer-mode", false));
-    QCOMPARE(seen.take(),
-             QStringList({QStringLiteral("developerModeEnabledChanged()"),
-                          QStringLiteral("developerModeChangeError()")}));
+    QCOMPARE(seen.take(), QStringList({enabledChanged, changeError}));
 }
 
 QTEST_GUILESS_MAIN(SecuritySettingsTest)
