@@ -1,6 +1,8 @@
 // SPDX-License-Identifier: LGPL-2.1-or-later
 #include <devicelock/velddbusconnection.h>
 
+#include "frame/signalconnection_p.h"
+
 #include <QtDBus/QDBusMessage>
 #include <QtDBus/QDBusPendingCallWatcher>
 
@@ -51,13 +53,15 @@ public:
     void follow()
     {
         link = std::make_shared<Link>(current.name());
-        current.connect(QString(), localPath, localInterface, disconnectedMember, this, SLOT(tellEnd()));
+        connectDBusSignal(current, {QString(), localPath, localInterface, disconnectedMember}, this,
+                          SLOT(tellEnd()));
     }
 
     void forget()
     {
         ping.reset();
-        current.disconnect(QString(), localPath, localInterface, disconnectedMember, this, SLOT(tellEnd()));
+        disconnectDBusSignal(current, {QString(), localPath, localInterface, disconnectedMember}, this,
+                             SLOT(tellEnd()));
         link.reset();
     }
 

@@ -1,6 +1,8 @@
 // SPDX-License-Identifier: LGPL-2.1-or-later
 #include "remoteproperties_p.h"
 
+#include "frame/signalconnection_p.h"
+
 #include <QtCore/QDebug>
 #include <QtDBus/QDBusConnection>
 #include <QtDBus/QDBusMessage>
@@ -22,7 +24,7 @@ RemoteProperties::RemoteProperties(const QString &service, const QString &path, 
     , m_path(path)
     , m_interface(interface)
 {
-    QDBusConnection bus = QDBusConnection::systemBus();
+    const QDBusConnection bus = QDBusConnection::systemBus();
     auto *watcher = new QDBusServiceWatcher(service, bus, QDBusServiceWatcher::WatchForOwnerChange, this);
     connect(watcher, &QDBusServiceWatcher::serviceOwnerChanged, this,
             [this](const QString &, const QString &, const QString &newOwner) {
@@ -33,8 +35,8 @@ RemoteProperties::RemoteProperties(const QString &service, const QString &path, 
             });
     // The last signal of the watcher, which a receiver may thus destroy.
     connect(watcher, &QDBusServiceWatcher::serviceUnregistered, this, &RemoteProperties::serviceLeft);
-    bus.connect(service, path, propertiesInterface, QStringLiteral("PropertiesChanged"), this,
-                SLOT(propertiesChanged(QString, QVariantMap, QStringList)));
+    connectDBusSignal(bus, {service, path, propertiesInterface, QStringLiteral("PropertiesChanged")}, this,
+                      SLOT(propertiesChanged(QString, QVariantMap, QStringList)));
     askForAll();
 }
 

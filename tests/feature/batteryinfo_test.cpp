@@ -6,6 +6,7 @@
 #include <corvanemdm/batteryinfo.h>
 
 #include <QtCore/QMetaEnum>
+#include <QtDBus/QDBusMetaType>
 #include <QtTest/QtTest>
 
 #include <memory>
@@ -50,6 +51,8 @@ private Q_SLOTS:
     void serviceThatRestarts();
     void errorsAreLogged();
     void propertiesOfOtherObjectsAreNotTaken();
+    void announcementsOfAnotherShapeAreNotTaken_data();
+    void announcementsOfAnotherShapeAreNotTaken();
     void deletionInASlot();
     void deletionWhenTheServiceLeaves();
     void worksThroughTheMetaObject();
@@ -243,6 +246,35 @@ void BatteryInfoTest::propertiesOfOtherObjectsAreNotTaken()
     // What is only said to have changed is asked for.
     announce(Display, "org.freedesktop.UPower.Device", {}, {QStringLiteral("Percentage")});
     becomes(battery, QStringLiteral("Normal Disconnected 76"));
+}
+
+void BatteryInfoTest::announcementsOfAnotherShapeAreNotTaken_data()
+{
+    QTest::addColumn<QVariantList>("arguments");
+    const QString interface = QStringLiteral("org.freedesktop.UPower.Device");
+    const QVariantMap changed{{QStringLiteral("Percentage"), 1.0}};
+    const QVariant numbers = QVariant::fromValue(QList<int>{1, 2});
+    QTest::newRow("nothing") << QVariantList();
+    QTest::newRow("interface alone") << QVariantList{interface};
+    QTest::newRow("no list") << QVariantList{interface, changed};
+    QTest::newRow("number for the interface") << QVariantList{7, changed, QStringList()};
+    QTest::newRow("numbers for the properties") << QVariantList{interface, numbers, QStringList()};
+    QTest::newRow("numbers for the list") << QVariantList{interface, changed, numbers};
+    QTest::newRow("one more") << QVariantList{interface, changed, QStringList(), 7};
+}
+
+void BatteryInfoTest::announcementsOfAnotherShapeAreNotTaken()
+{
+    QFETCH(QVariantList, arguments);
+    qDBusRegisterMetaType<QList<int>>();
+    const BatteryInfo battery;
+    becomes(battery, QStringLiteral("Normal Disconnected 76"));
+    m_phone->emitSignal(Service, Display, QStringLiteral("org.freedesktop.DBus.Properties"),
+                        QStringLiteral("PropertiesChanged"), arguments);
+    QCOMPARE(textOf(battery), QStringLiteral("Normal Disconnected 76"));
+    // It still listens.
+    set("50", "off");
+    becomes(battery, QStringLiteral("Normal Disconnected 50"));
 }
 
 void BatteryInfoTest::deletionInASlot()

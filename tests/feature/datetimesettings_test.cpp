@@ -8,7 +8,9 @@
 
 #include <QtCore/QDir>
 #include <QtCore/QFile>
+#include <QtCore/QMetaProperty>
 #include <QtCore/QTimeZone>
+#include <QtDBus/QDBusMetaType>
 #include <QtTest/QtTest>
 
 #include <cstdlib>
@@ -75,6 +77,7 @@ private Q_SLOTS:
     void serviceThatIsNotThere();
     void serviceThatRestarts();
     void propertiesOfAnotherType();
+    void announcementsOfAnotherShapeAreNotTaken();
     void deletionInASlot_data();
     void deletionInASlot();
     void destructionWithCallsPending();
@@ -470,6 +473,27 @@ void DateTimeSettingsTest::propertiesOfAnotherType()
              qPrintable(warnings.last()));
 }
 
+void DateTimeSettingsTest::announcementsOfAnotherShapeAreNotTaken()
+{
+    qDBusRegisterMetaType<QList<int>>();
+    const auto settings = ready();
+    SignalSequence seen(settings.get());
+    const auto announce = [this](const QVariantList &arguments) {
+        m_phone->emitSignal(Service, Path, QStringLiteral("org.freedesktop.DBus.Properties"),
+                            QStringLiteral("PropertiesChanged"), arguments);
+    };
+    const QVariantMap changed{{QStringLiteral("Timezone"), QStringLiteral("Asia/Tokyo")}};
+    const QVariant numbers = QVariant::fromValue(QList<int>{1, 2});
+    announce({Service, numbers, QStringList()});
+    announce({Service, changed, numbers});
+    announce({Service, changed});
+    announce({7, changed, QStringList()});
+    QCOMPARE(seen.take(), QStringList());
+    announce({Service, changed, QStringList()});
+    QCOMPARE(seen.take(), texts({"timeZoneChanged()"}));
+    QCOMPARE(settings->timeZone(), QStringLiteral("Asia/Tokyo"));
+}
+
 void DateTimeSettingsTest::deletionInASlot_data()
 {
     QTest::addColumn<QByteArray>("signal");
@@ -543,6 +567,21 @@ void DateTimeSettingsTest::worksThroughTheMetaObject()
     QVERIFY(QMetaObject::invokeMethod(settings.get(), "setTime", Q_ARG(int, 1), Q_ARG(int, 2)));
     QVERIFY(QMetaObject::invokeMethod(settings.get(), "setDate", Q_ARG(QDate, QDate(2030, 1, 1))));
     QVERIFY(seen.waitFor(2));
+    const QMetaObject &meta = DateTimeSettings::staticMetaObject;
+    QStringList properties;
+    for (int i = meta.propertyOffset(); i < meta.propertyCount(); ++i) {
+        const QMetaProperty property = meta.property(i);
+        QVERIFY(property.isReadable());
+        properties << QStringLiteral("%1 %2 %3 %4")
+                          .arg(QLatin1String(property.typeName()), QLatin1String(property.name()),
+                               property.isWritable() ? QStringLiteral("rw") : QStringLiteral("r"),
+                               QLatin1String(property.notifySignal().name()));
+    }
+    QCOMPARE(
+        properties,
+        texts({"bool ready r readyChanged", "bool automaticDateTimeUpdate rw automaticDateTimeUpdateChanged",
+               "bool automaticTimeZoneUpdate rw automaticTimeZoneUpdateChanged",
+               "QString timeZone rw timeZoneChanged"}));
     QStringList zones;
     QVERIFY(
         QMetaObject::invokeMethod(settings.get(), "supportedTimeZones", Q_RETURN_ARG(QStringList, zones)));
