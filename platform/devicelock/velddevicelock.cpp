@@ -62,6 +62,14 @@ public:
     LockState state = Undefined;
 
 private Q_SLOTS:
+    void announced(uint number)
+    {
+        // It is newer than an answer that is still to come, which may have been overtaken.
+        answer.reset();
+        setState(number);
+    }
+
+private:
     // The daemon's state on the wire.
     void setState(uint number)
     {
@@ -72,7 +80,6 @@ private Q_SLOTS:
         Q_EMIT q->stateChanged();
     }
 
-private:
     void reconnect()
     {
         // What the daemon before this one told is worth nothing, also when its end has not been noticed.
@@ -88,7 +95,7 @@ private:
             return;
         QDBusConnection peer = connection.connection();
         connectDBusSignal(peer, {QString(), statePath, stateInterface, changedMember}, this,
-                          SLOT(setState(uint)));
+                          SLOT(announced(uint)));
         answer = std::make_unique<QDBusPendingCallWatcher>(
             peer.asyncCall(QDBusMessage::createMethodCall(QString(), statePath, stateInterface, getMethod)));
         connect(answer.get(), &QDBusPendingCallWatcher::finished, this, [this] {

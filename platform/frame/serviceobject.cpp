@@ -73,10 +73,8 @@ ServiceOwner::ServiceOwner(const QString &service)
     connect(watcher, &QDBusServiceWatcher::serviceRegistered, this, takeNextOwner);
     connect(watcher, &QDBusServiceWatcher::serviceUnregistered, this, takeNextOwner);
 
-    auto *answer = new QDBusPendingCallWatcher(bus.asyncCall(question()), this);
-    connect(answer, &QDBusPendingCallWatcher::finished, this, [this](QDBusPendingCallWatcher *finished) {
-        finished->deleteLater();
-        const QDBusPendingReply<QString> reply = *finished;
+    CallAnswer::follow(bus, question(), this, [this](const QDBusMessage &answer) {
+        const QDBusPendingReply<QString> reply = answer;
         if (!reply.isError())
             setOwner(reply.value());
     });
@@ -171,12 +169,12 @@ void ServiceObject::disconnectSignals()
         disconnectDBusSignal(bus, signalOf(each), each.receiver, each.slot);
 }
 
-QDBusPendingCall ServiceObject::send(const QString &path, QLatin1String method,
-                                     const QVariantList &arguments) const
+void ServiceObject::send(const QString &path, QLatin1String method, const QVariantList &arguments,
+                         const CallAnswer::Handler &handler) const
 {
     QDBusMessage call = QDBusMessage::createMethodCall(m_owner, path, m_interface, method);
     call.setArguments(arguments);
-    return QDBusConnection::systemBus().asyncCall(call, noTimeout);
+    CallAnswer::follow(QDBusConnection::systemBus(), call, m_answers.get(), handler, noTimeout);
 }
 
 void ServiceObject::forgetCalls()

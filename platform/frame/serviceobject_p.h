@@ -2,6 +2,7 @@
 #ifndef CORVANEMDM_PLATFORM_FRAME_SERVICEOBJECT_P_H
 #define CORVANEMDM_PLATFORM_FRAME_SERVICEOBJECT_P_H
 
+#include "callanswer_p.h"
 #include "signalconnection_p.h"
 
 #include <QtCore/QObject>
@@ -12,7 +13,6 @@
 #include <QtCore/QVector>
 #include <QtCore/QWeakPointer>
 #include <QtDBus/QDBusMessage>
-#include <QtDBus/QDBusPendingCallWatcher>
 #include <QtDBus/QDBusPendingReply>
 
 #include <memory>
@@ -98,12 +98,7 @@ public:
     template <typename Reply, typename Handler>
     void callAt(const QString &path, QLatin1String method, const QVariantList &arguments, Handler handler)
     {
-        auto *watcher = new QDBusPendingCallWatcher(send(path, method, arguments), m_answers.get());
-        connect(watcher, &QDBusPendingCallWatcher::finished, m_answers.get(),
-                [handler](QDBusPendingCallWatcher *finished) {
-                    finished->deleteLater();
-                    handler(Reply(*finished));
-                });
+        send(path, method, arguments, [handler](const QDBusMessage &answer) { handler(Reply(answer)); });
     }
     void forgetCalls();
 
@@ -118,7 +113,8 @@ private:
         const char *slot;
     };
 
-    QDBusPendingCall send(const QString &path, QLatin1String method, const QVariantList &arguments) const;
+    void send(const QString &path, QLatin1String method, const QVariantList &arguments,
+              const CallAnswer::Handler &handler) const;
     DBusSignal signalOf(const Connection &connection) const;
     void connectSignals();
     void disconnectSignals();
@@ -129,7 +125,7 @@ private:
     const QLatin1String m_interface;
     QVector<Connection> m_connections;
     QString m_owner; // with which the connections are
-    std::unique_ptr<QObject> m_answers; // parent of what waits for an answer
+    std::unique_ptr<QObject> m_answers; // what is answered after its end is dropped
 };
 
 #endif // CORVANEMDM_PLATFORM_FRAME_SERVICEOBJECT_P_H

@@ -1,16 +1,14 @@
 // SPDX-License-Identifier: LGPL-2.1-or-later
 #include "remoteproperties_p.h"
 
+#include "frame/callanswer_p.h"
 #include "frame/signalconnection_p.h"
 
 #include <QtCore/QDebug>
 #include <QtDBus/QDBusConnection>
 #include <QtDBus/QDBusMessage>
-#include <QtDBus/QDBusPendingCallWatcher>
 #include <QtDBus/QDBusPendingReply>
 #include <QtDBus/QDBusServiceWatcher>
-
-#include <utility>
 
 namespace
 {
@@ -29,7 +27,7 @@ RemoteProperties::RemoteProperties(const QString &service, const QString &path, 
     connect(watcher, &QDBusServiceWatcher::serviceOwnerChanged, this,
             [this](const QString &, const QString &, const QString &newOwner) {
                 m_values.clear();
-                delete std::exchange(m_question, nullptr);
+                m_question.reset();
                 if (!newOwner.isEmpty())
                     askForAll();
             });
@@ -45,16 +43,15 @@ void RemoteProperties::askForAll()
     QDBusMessage call
         = QDBusMessage::createMethodCall(m_service, m_path, propertiesInterface, QStringLiteral("GetAll"));
     call.setArguments({m_interface});
-    delete std::exchange(m_question, nullptr);
-    m_question = new QDBusPendingCallWatcher(QDBusConnection::systemBus().asyncCall(call), this);
-    connect(m_question, &QDBusPendingCallWatcher::finished, this, &RemoteProperties::answered);
+    m_question = std::make_unique<QObject>();
+    CallAnswer::follow(QDBusConnection::systemBus(), call, m_question.get(),
+                       [this](const QDBusMessage &answer) { answered(answer); });
 }
 
-void RemoteProperties::answered(QDBusPendingCallWatcher *answer)
+void RemoteProperties::answered(const QDBusMessage &answer)
 {
-    answer->deleteLater();
-    m_question = nullptr;
-    const QDBusPendingReply<QVariantMap> reply = *answer;
+    m_question.reset();
+    const QDBusPendingReply<QVariantMap> reply = answer;
     if (!reply.isError()) {
         m_values = reply.value();
         Q_EMIT changed();

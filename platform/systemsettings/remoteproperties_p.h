@@ -7,7 +7,9 @@
 #include <QtCore/QStringList>
 #include <QtCore/QVariantMap>
 
-class QDBusPendingCallWatcher;
+#include <memory>
+
+class QDBusMessage;
 
 /** The properties of an object on the system bus, mirrored through the restarts of its service. */
 class RemoteProperties : public QObject
@@ -34,13 +36,13 @@ private Q_SLOTS:
 
 private:
     void askForAll();
-    void answered(QDBusPendingCallWatcher *answer);
+    void answered(const QDBusMessage &answer);
 
     const QString m_service;
     const QString m_path;
     const QString m_interface;
     QVariantMap m_values;
-    QDBusPendingCallWatcher *m_question = nullptr;
+    std::unique_ptr<QObject> m_question; ///< while there is one whose answer counts
 };
 
 #endif // CORVANEMDM_PLATFORM_SYSTEMSETTINGS_REMOTEPROPERTIES_P_H

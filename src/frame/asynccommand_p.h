@@ -2,7 +2,10 @@
 #ifndef CORVANEMDM_ASYNCCOMMAND_P_H
 #define CORVANEMDM_ASYNCCOMMAND_P_H
 
+#include "platform/frame/callanswer_p.h"
+
 #include <QtCore/QPointer>
+#include <QtDBus/QDBusAbstractInterface>
 #include <QtDBus/QDBusPendingCall>
 
 #include <utility>
@@ -20,6 +23,26 @@ void watchCall(const QDBusPendingCall &call, Owner *owner, void (Owner::*slot)(Q
 {
     auto *watcher = new QDBusPendingCallWatcher(call, parent ? parent : owner);
     QObject::connect(watcher, &QDBusPendingCallWatcher::finished, owner, slot);
+}
+
+/**
+ * Calls @p method of @p interface, for the state that @p owner mirrors: the answer comes at its place among
+ * the signals of the service, see CallAnswer. The rest is as with watchCall().
+ */
+template <typename Owner>
+void askForState(QDBusAbstractInterface *interface, const QString &method, Owner *owner,
+                 void (Owner::*slot)(QDBusPendingCallWatcher *), QObject *parent = nullptr)
+{
+    QObject *context = parent ? parent : owner;
+    CallAnswer::follow(
+        interface->connection(),
+        QDBusMessage::createMethodCall(interface->service(), interface->path(), interface->interface(),
+                                       method),
+        context,
+        [owner, slot, context](const QDBusMessage &answer) {
+            (owner->*slot)(new QDBusPendingCallWatcher(QDBusPendingCall::fromCompletedCall(answer), context));
+        },
+        interface->timeout());
 }
 
 /** Calls back once @p call has been answered; how AsyncCommand learns the outcome of its pending object. */

@@ -66,7 +66,7 @@ public:
     template <typename Owner> void getAll(Owner *owner, void (Owner::*slot)(QDBusPendingCallWatcher *))
     {
         m_started = true;
-        watchCall(m_interface->asyncCall(QStringLiteral("GetAll")), owner, slot);
+        askForState(m_interface, QStringLiteral("GetAll"), owner, slot);
     }
 
     bool requestDefaultAction(SimFilter::Action action);

@@ -347,7 +347,7 @@ QDBusInterface *SimInfoPrivate::createInterface(
     auto *object = new QDBusInterface(OfonoService, path, interface, bus, this);
     connectDBusSignal(bus, {OfonoService, path, interface, PropertyChanged}, this, changedSlot);
     // The answer goes with the interface that asked.
-    watchCall(object->asyncCall(GetProperties), this, finishedSlot, object);
+    askForState(object, GetProperties, this, finishedSlot, object);
     return object;
 }
 
