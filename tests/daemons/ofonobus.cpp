@@ -1,8 +1,11 @@
 // SPDX-License-Identifier: LGPL-2.1-or-later
 #include "ofonobus.h"
 
+#include "phone.h"
 #include "waiting.h"
 
+#include <QtCore/QJsonArray>
+#include <QtCore/QJsonObject>
 #include <QtDBus/QDBusArgument>
 #include <QtDBus/QDBusConnection>
 #include <QtDBus/QDBusMetaType>
@@ -49,9 +52,12 @@ QDBusMessage OfonoBus::call(const char *path, const char *interface, const char 
     QDBusMessage message = QDBusMessage::createMethodCall(QLatin1String(service), QLatin1String(path),
                                                           QLatin1String(interface), QLatin1String(member));
     message.setArguments(arguments);
-    // Signals that come before the answer have to be seen before it.
+    // Signals that come before the answer have to be seen before it. Not isFinished(), which is true as soon
+    // as QtDBus's thread has the answer.
     QDBusPendingCallWatcher watcher(QDBusConnection::systemBus().asyncCall(message));
-    if (!waitUntil([&watcher] { return watcher.isFinished(); }))
+    bool finished = false;
+    QObject::connect(&watcher, &QDBusPendingCallWatcher::finished, [&finished] { finished = true; });
+    if (!waitUntil([&finished] { return finished; }))
         qFatal("%s at %s is not answered", member, path);
     return watcher.reply();
 }
@@ -86,6 +92,37 @@ QVariant OfonoBus::objectPaths(const QStringList &paths)
     for (const QString &path : paths)
         list << QDBusObjectPath(path);
     return QVariant::fromValue(list);
+}
+
+void OfonoBus::restoreModems(Phone &phone)
+{
+    static const QStringList cards{QStringLiteral("244051234567890"), QStringLiteral("262021234567891")};
+    phone.startService(QLatin1String(service));
+    const QJsonArray sims = phone.state().value(QLatin1String("sims")).toArray();
+    for (int slot = 0; slot < cards.size(); ++slot) {
+        const QString number = QString::number(slot);
+        const QJsonObject sim = sims.at(slot).toObject();
+        const bool isOwn = sim.value(QLatin1String("imsi")).toString() == cards.at(slot);
+        bool isPresent = sim.value(QLatin1String("present")).toBool();
+        if (isPresent && !isOwn) {
+            phone.act(QStringLiteral("sim pull"), {number});
+            isPresent = false;
+        }
+        if (!isPresent)
+            phone.act(QStringLiteral("sim insert"), {number, cards.at(slot)});
+        phone.act(QStringLiteral("sim lock"), {number, QStringLiteral("none")});
+        phone.act(QStringLiteral("network"), {number, QStringLiteral("registered")});
+    }
+    call("/", modemManagerInterface, "SetEnabledModems",
+         {objectPaths({QStringLiteral("/ril_0"), QStringLiteral("/ril_1")})});
+    call("/", modemManagerInterface, "SetDefaultVoiceSim", {QString()});
+    call("/", modemManagerInterface, "SetDefaultDataSim", {QString()});
+    for (const char *path : {"/ril_0", "/ril_1"}) {
+        for (const char *property : {"Powered", "Online"}) {
+            call(path, modemInterface, "SetProperty",
+                 {QString::fromLatin1(property), QVariant::fromValue(QDBusVariant(true))});
+        }
+    }
 }
 
 OfonoSignals::OfonoSignals(const QStringList &interfaces)

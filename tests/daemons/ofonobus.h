@@ -8,6 +8,8 @@
 #include <QtCore/QVariantMap>
 #include <QtDBus/QDBusMessage>
 
+class Phone;
+
 namespace OfonoBus
 {
 
@@ -34,6 +36,13 @@ QVariantMap properties(const char *path, const char *interface);
 QString toText(const QVariantList &arguments);
 
 QVariant objectPaths(const QStringList &paths);
+
+/**
+ * Makes the modems what they were when the phone came up, whatever a test that failed has left: the service
+ * runs, the cards are in their slots and ask for nothing, all modems are enabled and online, no SIM is
+ * chosen. Some of it takes effect only later.
+ */
+void restoreModems(Phone &phone);
 
 } // namespace OfonoBus
 

@@ -68,6 +68,7 @@ private:
 
 private Q_SLOTS:
     void init() { m_signals.take(); }
+    void cleanup();
     void everythingIsTold();
     void everythingIsIntrospected();
     void otherObjectsHaveNothing();
@@ -85,6 +86,22 @@ private Q_SLOTS:
     void storeThatIsBroken();
     void anotherCard();
 };
+
+void OfonoPluginTest::cleanup()
+{
+    // What one function has left is not for the others to fail over.
+    if (!QTest::currentTestFailed())
+        return;
+    QDir(choiceFile).removeRecursively();
+    restoreModems(m_phone);
+    QVERIFY(waitUntil([] {
+        return askSim("/ril_0", "GetSubscriberIdentity") == firstImsi
+            && askSim("/ril_1", "GetSubscriberIdentity") == secondImsi
+            && ask("GetPresentSims") == QLatin1String("[true true]") && ask("GetDefaultVoiceSim") == firstImsi
+            && ask("GetDefaultDataSim") == firstImsi;
+    }));
+    QVERIFY(waitForOnline("/ril_0", true) && waitForOnline("/ril_1", true));
+}
 
 void OfonoPluginTest::everythingIsTold()
 {
@@ -216,7 +233,7 @@ void OfonoPluginTest::lockedCard()
     };
     QVERIFY(waitUntil(isLocked));
     QCOMPARE(ask("GetPresentSims"), QStringLiteral("[true true]"));
-    QVERIFY(!askSim("/ril_1", "GetCardIdentifier").isEmpty());
+    QVERIFY(waitUntil([] { return !askSim("/ril_1", "GetCardIdentifier").isEmpty(); }));
     QCOMPARE(askSim("/ril_1", "GetSubscriberIdentity"), QString());
     m_signals.take();
 

@@ -62,6 +62,14 @@ bool hasService()
     return reply.type() == QDBusMessage::ReplyMessage;
 }
 
+/** Whether oFono has the context in use. */
+bool isActive()
+{
+    return OfonoBus::properties("/ril_0/context1", "org.ofono.ConnectionContext")
+        .value(QStringLiteral("Active"))
+        .toBool();
+}
+
 /** Sends so many datagrams of a KiB out over mobile data; the network behind it has nobody who minds. */
 bool sendDatagrams(int count)
 {
@@ -132,6 +140,19 @@ void RealMobileDataTest::init()
 
 void RealMobileDataTest::cleanup()
 {
+    // Whoever comes next begins without a connection, also when this function has failed.
+    if (QTest::currentTestFailed()) {
+        for (const QString &daemon : {Ofono, Connman})
+            m_phone.startService(daemon);
+        ConnectivitySettings().setFlightModeEnabled(false);
+    }
+    QVERIFY(waitUntil(hasService));
+    {
+        ConnectivitySettings settings;
+        if (settings.isConnectedToMobileNetwork(Imsi))
+            settings.disconnectFromMobileNetwork(Imsi);
+        QVERIFY(waitUntil([&settings] { return !settings.isConnectedToMobileNetwork(Imsi) && !isActive(); }));
+    }
     const QStringList warnings = m_log->takeWarnings();
     m_log.reset();
     QCOMPARE(warnings.join(QLatin1Char(0x0a)), QString());
@@ -199,11 +220,6 @@ void RealMobileDataTest::accessPoints()
 void RealMobileDataTest::connectsAndDisconnects()
 {
     ConnectivitySettings settings;
-    const auto isActive = [] {
-        return OfonoBus::properties("/ril_0/context1", "org.ofono.ConnectionContext")
-            .value(QStringLiteral("Active"))
-            .toBool();
-    };
     QVERIFY(!settings.isConnectedToMobileNetwork(Imsi));
     QVERIFY(settings.disconnectFromMobileNetwork(Imsi));
     QVERIFY(settings.connectToMobileNetwork(Imsi));
@@ -212,7 +228,7 @@ void RealMobileDataTest::connectsAndDisconnects()
     const QString refused = QStringLiteral("Unable to set auto connect: \"Invalid service\"");
     QCOMPARE(m_log->takeWarnings(), (QStringList{refused, refused}));
     QVERIFY(settings.isConnectedToMobileNetwork(Imsi));
-    QVERIFY(isActive());
+    QVERIFY(waitUntil(isActive));
     // "Already connected", in ConnMan's own words.
     QVERIFY(settings.connectToMobileNetwork(Imsi));
     QCOMPARE(m_log->takeInfos().last(),
@@ -220,7 +236,7 @@ void RealMobileDataTest::connectsAndDisconnects()
 
     QVERIFY(settings.disconnectFromMobileNetwork(Imsi));
     QVERIFY(waitUntil([&] { return !settings.isConnectedToMobileNetwork(Imsi); }));
-    QVERIFY(waitUntil([&] { return !isActive(); }));
+    QVERIFY(waitUntil([] { return !isActive(); }));
     QVERIFY(settings.disconnectFromMobileNetwork(Imsi));
     QCOMPARE(m_log->takeInfos().last(),
              QStringLiteral("Already disconnected from network via IMSI: \"244051234567890\""));

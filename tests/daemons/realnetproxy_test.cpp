@@ -63,10 +63,12 @@ void RealNetProxyTest::stockDaemonHasNoGlobalProxy()
          {"^MDM Proxy: error:  QDBusError", "^MDM Proxy: global proxy proxy error:  QDBusError"})
         QTest::ignoreMessage(QtDebugMsg, QRegularExpression(QLatin1String(message)));
     NetProxy proxy;
-    QVERIFY(waitUntil([&] { return proxy.getTechnologies().size() > 1; }));
+    QVERIFY(waitUntil([&] {
+        return proxy.getTechnologies().contains(QStringLiteral("Wired"))
+            && !proxy.getIdentifiers(QStringLiteral("ethernet")).isEmpty();
+    }));
     m_phone.settle(QStringLiteral("org.ofono"));
     QVERIFY(!proxy.isValid());
-    QVERIFY(proxy.getTechnologies().contains(QStringLiteral("Wired")));
     QCOMPARE(proxy.getIdentifiers(QStringLiteral("ethernet")).size(), 1);
 }
 

@@ -23,7 +23,9 @@ void RealUPowerTest::tellsTheBattery()
 {
     MessageLog log;
     const BatteryInfo battery;
-    QVERIFY(waitUntil([&] { return battery.chargePercentage() >= 0 && battery.chargerStatus() >= 0; }));
+    QVERIFY(waitUntil([&] {
+        return battery.chargePercentage() >= 0 && battery.chargerStatus() >= 0 && battery.status() >= 0;
+    }));
     QCOMPARE(battery.chargePercentage(), 76);
     QCOMPARE(battery.status(), BatteryStatus::Normal);
     QCOMPARE(battery.chargerStatus(), BatteryStatus::Disconnected);
@@ -37,9 +39,15 @@ void RealUPowerTest::followsARestart()
     const BatteryInfo battery;
     QVERIFY(waitUntil([&] { return battery.chargePercentage() == 76; }));
     phone.stopService(service);
-    QVERIFY(waitUntil([&] { return battery.chargePercentage() == -1; }));
+    QVERIFY(waitUntil([&] {
+        return battery.chargePercentage() == -1 && battery.status() == BatteryStatus::BatteryStatusUnknown
+            && battery.chargerStatus() == BatteryStatus::ChargerStatusUnknown;
+    }));
     phone.startService(service);
-    QVERIFY(waitUntil([&] { return battery.chargePercentage() == 76; }));
+    QVERIFY(waitUntil([&] {
+        return battery.chargePercentage() == 76 && battery.status() == BatteryStatus::Normal
+            && battery.chargerStatus() == BatteryStatus::Disconnected;
+    }));
 }
 
 QTEST_GUILESS_MAIN(RealUPowerTest)

@@ -39,17 +39,25 @@ void StockOfonoTest::modems()
     const QDBusMessage reply = call("/", managerInterface, "GetModems");
     QCOMPARE(reply.signature(), QStringLiteral("a(oa{sv})"));
     for (const char *path : {"/ril_0", "/ril_1"}) {
-        const QVariantMap modem = properties(path, modemInterface);
-        QCOMPARE(modem.value(QStringLiteral("Powered")), QVariant(true));
-        QCOMPARE(modem.value(QStringLiteral("Online")), QVariant(true));
-        QCOMPARE(modem.value(QStringLiteral("Type")).toString(), QStringLiteral("hardware"));
-        const QStringList interfaces = modem.value(QStringLiteral("Interfaces")).toStringList();
+        const auto property = [path](const char *name) {
+            return properties(path, modemInterface).value(QLatin1String(name));
+        };
+        QCOMPARE(property("Powered"), QVariant(true));
+        QCOMPARE(property("Online"), QVariant(true));
+        QCOMPARE(property("Type").toString(), QStringLiteral("hardware"));
+        // Each comes when its driver is done with its questions.
         for (const char *interface : {simInterface, registrationInterface, "org.ofono.RadioSettings",
-                                      "org.ofono.ConnectionManager", "org.ofono.VoiceCallManager"})
-            QVERIFY2(interfaces.contains(QLatin1String(interface)), interface);
+                                      "org.ofono.ConnectionManager", "org.ofono.VoiceCallManager"}) {
+            QVERIFY2(waitUntil([&] {
+                         return property("Interfaces").toStringList().contains(QLatin1String(interface));
+                     }),
+                     interface);
+        }
     }
-    QCOMPARE(properties("/ril_1", modemInterface).value(QStringLiteral("Serial")).toString(),
-             QStringLiteral("358240051111101"));
+    QVERIFY(waitUntil([] {
+        return properties("/ril_1", modemInterface).value(QStringLiteral("Serial"))
+            == QLatin1String("358240051111101");
+    }));
 }
 
 void StockOfonoTest::sims_data()
@@ -93,12 +101,19 @@ void StockOfonoTest::registration()
 
 void StockOfonoTest::contexts()
 {
-    QVERIFY(properties("/ril_0", "org.ofono.ConnectionManager").value(QStringLiteral("Attached")).toBool());
-    QCOMPARE(call("/ril_0/context1", "org.ofono.ConnectionContext", "GetProperties").type(),
-             QDBusMessage::ReplyMessage);
-    QCOMPARE(properties("/ril_0", "org.ofono.RadioSettings")
-                 .value(QStringLiteral("AvailableTechnologies"))
-                 .toStringList(),
+    QVERIFY(waitUntil([] {
+        return properties("/ril_0", "org.ofono.ConnectionManager").value(QStringLiteral("Attached")).toBool();
+    }));
+    QVERIFY(waitUntil([] {
+        return call("/ril_0/context1", "org.ofono.ConnectionContext", "GetProperties").type()
+            == QDBusMessage::ReplyMessage;
+    }));
+    QVariantMap radio;
+    QVERIFY(waitUntil([&radio] {
+        radio = properties("/ril_0", "org.ofono.RadioSettings");
+        return !radio.isEmpty();
+    }));
+    QCOMPARE(radio.value(QStringLiteral("AvailableTechnologies")).toStringList(),
              QStringList({QStringLiteral("gsm"), QStringLiteral("umts"), QStringLiteral("lte")}));
 }
 
