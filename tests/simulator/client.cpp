@@ -4,6 +4,7 @@
 #include "waiting.h"
 
 #include <QtCore/QUuid>
+#include <QtCore/QXmlStreamReader>
 #include <QtDBus/QDBusMetaType>
 #include <QtDBus/QDBusObjectPath>
 #include <QtDBus/QDBusPendingCall>
@@ -85,8 +86,16 @@ QString textOf(const QVariantList &values)
 
 } // namespace
 
+Client::Client(const QString &peerAddress)
+    : m_connectionName(QUuid::createUuid().toString())
+    , m_isPeer(true)
+    , m_connection(QDBusConnection::connectToPeer(peerAddress, m_connectionName))
+{
+}
+
 Client::Client(Connection connection)
     : m_connectionName(connection == Own ? QUuid::createUuid().toString() : QString())
+    , m_isPeer(false)
     , m_connection(connection == Own
                        ? QDBusConnection::connectToBus(QDBusConnection::SystemBus, m_connectionName)
                        : QDBusConnection::systemBus())
@@ -100,7 +109,9 @@ Client::~Client()
 {
     // QtDBus corrupts memory when a connection is closed under a call that is still waited for.
     qDeleteAll(findChildren<QDBusPendingCallWatcher *>());
-    if (!m_connectionName.isEmpty())
+    if (m_isPeer)
+        QDBusConnection::disconnectFromPeer(m_connectionName);
+    else if (!m_connectionName.isEmpty())
         QDBusConnection::disconnectFromBus(m_connectionName);
 }
 
@@ -114,7 +125,12 @@ QDBusMessage Client::call(const QString &service, const QString &path, const QSt
 {
     QDBusMessage message = QDBusMessage::createMethodCall(service, path, interface, member);
     message.setArguments(arguments);
-    QDBusPendingCallWatcher watcher(m_connection.asyncCall(message));
+    return callOver(m_connection, message);
+}
+
+QDBusMessage Client::callOver(const QDBusConnection &connection, const QDBusMessage &message)
+{
+    QDBusPendingCallWatcher watcher(connection.asyncCall(message));
     // Not isFinished(), which is true as soon as QtDBus's thread has the answer: signals that came before it
     // must not stay behind.
     bool finished = false;
@@ -125,8 +141,11 @@ QDBusMessage Client::call(const QString &service, const QString &path, const QSt
 
 QDBusMessage Client::control(const QString &member, const QVariantList &arguments) const
 {
-    return call(QStringLiteral("org.corvaneos.simulator"), QStringLiteral("/org/corvaneos/simulator"),
-                QStringLiteral("org.corvaneos.simulator.Control"), member, arguments);
+    QDBusMessage message = QDBusMessage::createMethodCall(
+        QStringLiteral("org.corvaneos.simulator"), QStringLiteral("/org/corvaneos/simulator"),
+        QStringLiteral("org.corvaneos.simulator.Control"), member);
+    message.setArguments(arguments);
+    return callOver(m_isPeer ? QDBusConnection::systemBus() : m_connection, message);
 }
 
 void Client::send(const QString &service, const QString &path, const QString &interface,
@@ -197,6 +216,31 @@ QVariant boxed(const QVariantList &values)
     for (const QVariant &value : values)
         boxes << QDBusVariant(value);
     return QVariant::fromValue(boxes);
+}
+
+QStringList membersOf(const QByteArray &xml, const QString &interface)
+{
+    QStringList members;
+    bool isWanted = false;
+    QXmlStreamReader reader(xml);
+    while (!reader.atEnd()) {
+        if (reader.readNext() != QXmlStreamReader::StartElement)
+            continue;
+        const QXmlStreamAttributes attributes = reader.attributes();
+        if (reader.name() == QLatin1String("node")) {
+            isWanted = false;
+        } else if (reader.name() == QLatin1String("interface")) {
+            isWanted = attributes.value(QLatin1String("name")) == interface;
+        } else if (isWanted && reader.name() == QLatin1String("arg")) {
+            members.last()
+                += QStringLiteral(" %1:%2:%3")
+                       .arg(attributes.value(QLatin1String("direction")),
+                            attributes.value(QLatin1String("type")), attributes.value(QLatin1String("name")));
+        } else if (isWanted) {
+            members << reader.name() + QLatin1Char(' ') + attributes.value(QLatin1String("name"));
+        }
+    }
+    return members;
 }
 
 QString textOf(const QDBusMessage &message)

@@ -37,9 +37,13 @@ public:
     enum Connection { Shared, Own };
 
     explicit Client(Connection connection = Shared);
+    /** A client at the socket of a service, rather than of the bus: @p peerAddress is the socket's, and
+     * services have no names there. */
+    explicit Client(const QString &peerAddress);
     ~Client() override;
 
     QString uniqueName() const;
+    bool isConnected() const { return m_connection.isConnected(); }
     /** Calls and waits; an interface that is empty is left out of the message. */
     QDBusMessage call(const QString &service, const QString &path, const QString &interface,
                       const QString &member, const QVariantList &arguments = {}) const;
@@ -64,13 +68,19 @@ private Q_SLOTS:
     void noteError(const QDBusError &error);
 
 private:
+    static QDBusMessage callOver(const QDBusConnection &connection, const QDBusMessage &message);
+
     const QString m_connectionName; ///< empty: shared
+    const bool m_isPeer;
     QDBusConnection m_connection;
     QStringList m_signals;
 };
 
 /** @p values as an argument of type av. */
 QVariant boxed(const QVariantList &values);
+/** The methods and signals of @p interface in @p xml, each with the directions, types and names of its
+ * arguments. */
+QStringList membersOf(const QByteArray &xml, const QString &interface);
 /** "name: message" of an error, "reply(arguments)" of anything else. */
 QString textOf(const QDBusMessage &message);
 

@@ -6,7 +6,6 @@
 #include <QtCore/QElapsedTimer>
 #include <QtCore/QJsonDocument>
 #include <QtCore/QJsonObject>
-#include <QtCore/QXmlStreamReader>
 #include <QtDBus/QDBusArgument>
 #include <QtDBus/QDBusPendingCallWatcher>
 #include <QtTest/QTest>
@@ -29,32 +28,6 @@ const QString getAll = QStringLiteral("GetAll");
 const QString all = QStringLiteral("reply(1, 2, [])");
 const QString refused = QStringLiteral("org.corvaneos.simulator.Error.InvalidArguments: ");
 const QString done = QStringLiteral("reply()");
-
-/** The methods and signals of an interface, each with the directions, types and names of its arguments. */
-QStringList membersOf(const QByteArray &xml, const QString &interface)
-{
-    QStringList members;
-    bool isWanted = false;
-    QXmlStreamReader reader(xml);
-    while (!reader.atEnd()) {
-        if (reader.readNext() != QXmlStreamReader::StartElement)
-            continue;
-        const QXmlStreamAttributes attributes = reader.attributes();
-        if (reader.name() == QLatin1String("node")) {
-            isWanted = false;
-        } else if (reader.name() == QLatin1String("interface")) {
-            isWanted = attributes.value(QLatin1String("name")) == interface;
-        } else if (isWanted && reader.name() == QLatin1String("arg")) {
-            members.last()
-                += QStringLiteral(" %1:%2:%3")
-                       .arg(attributes.value(QLatin1String("direction")),
-                            attributes.value(QLatin1String("type")), attributes.value(QLatin1String("name")));
-        } else if (isWanted) {
-            members << reader.name() + QLatin1Char(' ') + attributes.value(QLatin1String("name"));
-        }
-    }
-    return members;
-}
 
 } // namespace
 
