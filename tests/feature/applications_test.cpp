@@ -172,6 +172,7 @@ private Q_SLOTS:
     void destructionInEachPhase();
     void destructionWithSeveralPending();
     void destructionAfterARefusal();
+    void destructionAfterADeletedOperation();
     void requestsDuringDestruction();
     void deletedOperation_data();
     void deletedOperation();
@@ -974,6 +975,19 @@ void ApplicationsTest::destructionAfterARefusal()
     QCOMPARE(refused.wait(), failedWith("Trying to install package which is already being installed"));
     QCOMPARE(first.wait(),
              failedWith("Applications object destroyed while operation acme-broken in progress"));
+}
+
+void ApplicationsTest::destructionAfterADeletedOperation()
+{
+    auto applications = std::make_unique<Applications>();
+    MessageLog log;
+    delete applications->installPackage(QStringLiteral("acme-broken"));
+    Outcome removal(applications->removePackage(QStringLiteral("acme-broken")));
+    delete applications->removePackage(QStringLiteral("no-such-package"));
+    applications.reset();
+    QCOMPARE(removal.wait(),
+             failedWith("Applications object destroyed while operation acme-broken in progress"));
+    QCOMPARE(log.takeWarnings(), QStringList());
 }
 
 void ApplicationsTest::requestsDuringDestruction()

@@ -11,6 +11,7 @@
 
 using Corvane::Mdm::ApplicationEntry;
 using Corvane::Mdm::ApplicationOperation;
+using Corvane::Mdm::Applications;
 using Corvane::Mdm::PackageEntry;
 
 namespace
@@ -44,6 +45,7 @@ private Q_SLOTS:
     void success();
     void failure();
     void onlyTheFirstEndCounts();
+    void metaObjects();
     void endQueuedByName();
     void deletionInASlot_data();
     void deletionInASlot();
@@ -180,6 +182,29 @@ void ApplicationValuesTest::onlyTheFirstEndCounts()
     operation->setFinishedWithError();
     operation->setFinished();
     QCOMPARE(failing.take(), texts({"failed()", "finished()"}));
+}
+
+void ApplicationValuesTest::metaObjects()
+{
+    const QMetaObject &meta = ApplicationOperation::staticMetaObject;
+    QStringList methods;
+    for (int index = meta.methodOffset(); index < meta.methodCount(); ++index) {
+        const QMetaMethod method = meta.method(index);
+        methods.append(
+            QString::fromLatin1(method.methodSignature() + ' ' + method.parameterNames().join(' ')));
+        QCOMPARE(method.methodType(),
+                 index - meta.methodOffset() < 3 ? QMetaMethod::Signal : QMetaMethod::Slot);
+        QCOMPARE(method.access(), QMetaMethod::Public);
+    }
+    QCOMPARE(methods,
+             texts({"finished(ApplicationOperation*) applicationOperation",
+                    "failed(ApplicationOperation*) applicationOperation",
+                    "succeeded(ApplicationOperation*) applicationOperation", "setError(QString) errorString",
+                    "setFinished() ", "setFinishedWithError() "}));
+    QCOMPARE(meta.propertyCount(), QObject::staticMetaObject.propertyCount());
+    // The feature itself tells nothing.
+    QCOMPARE(Applications::staticMetaObject.propertyCount(), QObject::staticMetaObject.propertyCount());
+    QCOMPARE(Applications::staticMetaObject.methodCount(), QObject::staticMetaObject.methodCount());
 }
 
 void ApplicationValuesTest::endQueuedByName()
