@@ -12,11 +12,12 @@
 template <typename Condition> bool waitUntil(Condition condition)
 {
     constexpr int GiveUpMilliseconds = 30000;
+    constexpr int WakeUpMilliseconds = 50;
     QElapsedTimer elapsed;
     elapsed.start();
-    // Wakes the loop up once more when nothing else would.
+    // A condition that asks somebody else becomes true without an event here.
     QTimer wakeUp;
-    wakeUp.start(GiveUpMilliseconds / 10);
+    wakeUp.start(WakeUpMilliseconds);
     while (!condition()) {
         if (elapsed.elapsed() > GiveUpMilliseconds)
             return false;
