@@ -1,20 +1,30 @@
 // SPDX-License-Identifier: LGPL-2.1-or-later
 #include "callanswer_p.h"
 
-#include <QtCore/QCoreApplication>
-#include <QtCore/QThread>
+#include <QtCore/QThreadStorage>
 #include <QtDBus/QDBusConnection>
 #include <QtDBus/QDBusError>
 
+namespace
+{
+
+/** Holds what waits in this thread, to its end. */
+QObject *waitingRoom()
+{
+    static QThreadStorage<QObject *> rooms;
+    if (!rooms.hasLocalData())
+        rooms.setLocalData(new QObject);
+    return rooms.localData();
+}
+
+} // namespace
+
+// It does not go with the context: QtDBus's thread looks for its receiver without a lock.
 CallAnswer::CallAnswer(QObject *context, const Handler &handler)
-    : m_context(context)
+    : QObject(waitingRoom())
+    , m_context(context)
     , m_handler(handler)
 {
-    // QtDBus's thread looks for its receiver without a lock, so this does not go with the context. What is
-    // never answered goes with the application.
-    QCoreApplication *application = QCoreApplication::instance();
-    if (application && application->thread() == thread())
-        setParent(application);
 }
 
 void CallAnswer::follow(const QDBusConnection &bus, const QDBusMessage &call, QObject *context,

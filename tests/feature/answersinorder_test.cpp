@@ -64,11 +64,21 @@ private:
             QStringLiteral("Ping")));
         QCOMPARE(reply.type(), QDBusMessage::ReplyMessage);
     }
+    /** Waits until all that @p service was asked before has been answered: as Phone::settle(), without the
+     * event loop. */
+    void letAnswer(const QDBusConnection &connection, const QString &service) const
+    {
+        receive(connection, service);
+        m_phone.state();
+        receive(connection, service);
+    }
     void announce(const QString &service, const QString &path, const QString &interface,
                   const QString &member, const QVariantList &arguments)
     {
+        const QDBusConnection bus = QDBusConnection::systemBus();
+        letAnswer(bus, service);
         m_phone.sendSignal(service, path, interface, member, arguments);
-        receive(QDBusConnection::systemBus(), service);
+        receive(bus, service);
     }
 
     Phone m_phone;
@@ -128,6 +138,7 @@ void AnswersInOrderTest::lockState()
     const DeviceLock lock;
     const QDBusConnection link(QStringLiteral("org.veldmobile.devicelock.0"));
     QVERIFY(link.isConnected());
+    letAnswer(link, QString());
     m_phone.sendSignal(service, QStringLiteral("/devicelock/state"),
                        QStringLiteral("org.veldmobile.devicelock.State"), QStringLiteral("Changed"), {1u});
     receive(link, QString());
