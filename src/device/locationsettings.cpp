@@ -4,6 +4,7 @@
 #include "locationsettings_p.h"
 
 #include <QtCore/QDebug>
+#include <QtCore/QPointer>
 
 namespace Corvane
 {
@@ -177,8 +178,12 @@ void LocationSettings::setAgpsEnabled(const QString &agpsProvider, bool value)
 {
     if (!agpsAvailable(agpsProvider))
         return;
+    // What others have changed meanwhile is announced along with it, to who may delete this.
+    const QPointer<LocationSettings> alive(this);
     if (agpsProvider == mls)
         d->setMlsEnabled(value);
+    if (!alive)
+        return;
     const ::LocationSettings::OnlineState state = stateOf(d, agpsProvider);
     if (state == agreementNotAccepted) {
         if (value && agpsProvider == mls)

@@ -305,6 +305,11 @@ void BatteryInfoTest::worksThroughTheMetaObject()
     QCOMPARE(battery.property("status").value<BatteryStatus::Status>(), BatteryStatus::Normal);
     QCOMPARE(battery.property("chargerStatus").value<BatteryStatus::ChargerStatus>(),
              BatteryStatus::Disconnected);
+    // All of it is the base class's.
+    const QMetaObject *meta = battery.metaObject();
+    QCOMPARE(meta->superClass(), &BatteryStatus::staticMetaObject);
+    QCOMPARE(meta->propertyOffset(), meta->propertyCount());
+    QCOMPARE(meta->methodOffset(), meta->methodCount());
     QObject parent;
     const auto *child = new BatteryInfo(&parent);
     QCOMPARE(child->parent(), &parent);

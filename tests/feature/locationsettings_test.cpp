@@ -8,6 +8,7 @@
 #include <QtCore/QDir>
 #include <QtCore/QFile>
 #include <QtCore/QMetaEnum>
+#include <QtCore/QMetaProperty>
 #include <QtCore/QProcess>
 #include <QtTest/QtTest>
 
@@ -142,6 +143,7 @@ private Q_SLOTS:
     void dataSourcesAreDisallowedAsAWhole();
     void deletionInASlot();
     void worksThroughTheMetaObject();
+    void enumeratorsAndProperties();
 };
 
 void LocationSettingsTest::initTestCase()
@@ -578,6 +580,16 @@ void LocationSettingsTest::deletionInASlot()
     connect(settings.get(), &LocationSettings::locationEnabledChanged, this, [&] { settings.reset(); });
     writeGroup("gps_enabled=true\n");
     QVERIFY(waitUntil([&] { return !settings; }));
+
+    // A change of somebody else's comes to light with one that is made here.
+    writeGroup("mls_available=true\nmls_online_state=1\n");
+    settings = std::make_unique<LocationSettings>();
+    connect(settings.get(), &LocationSettings::locationEnabledChanged, this, [&] { settings.reset(); });
+    writeGroup("mls_available=true\nmls_online_state=1\nenabled=true\n");
+    settings->setAgpsEnabled(Mls, true);
+    QVERIFY(!settings);
+    QCOMPARE(stored("mls_enabled"), QByteArray("true"));
+    QCOMPARE(stored("mls_online_state"), QByteArray("1"));
 }
 
 void LocationSettingsTest::worksThroughTheMetaObject()
@@ -611,6 +623,44 @@ void LocationSettingsTest::worksThroughTheMetaObject()
     const QMetaEnum modes = QMetaEnum::fromType<LocationSettings::LocationMode>();
     QCOMPARE(modes.keyToValue("CustomMode"), 3);
     QCOMPARE(QMetaEnum::fromType<LocationSettings::DataSources>().keyToValue("SbasData"), 0x40000000);
+}
+
+void LocationSettingsTest::enumeratorsAndProperties()
+{
+    const QMetaObject &meta = LocationSettings::staticMetaObject;
+    const auto valuesOf = [&meta](const char *name) {
+        const QMetaEnum enumeration = meta.enumerator(meta.indexOfEnumerator(name));
+        QStringList values;
+        for (int i = 0; i < enumeration.keyCount(); ++i)
+            values << QStringLiteral("%1=0x%2")
+                          .arg(QLatin1String(enumeration.key(i)))
+                          .arg(uint(enumeration.value(i)), 0, 16);
+        return values;
+    };
+    QCOMPARE(
+        valuesOf("LocationMode"),
+        texts({"HighAccuracyMode=0x0", "BatterySavingMode=0x1", "DeviceOnlyMode=0x2", "CustomMode=0x3"}));
+    QCOMPARE(valuesOf("DataSources"),
+             texts({"NoDataSources=0x0", "OnlineDataSources=0x1", "DeviceSensorsData=0x20",
+                    "BluetoothData=0x400", "WlanData=0x8000", "CellTowerData=0x100000", "GpsData=0x2000000",
+                    "GlonassData=0x4000000", "BeidouData=0x8000000", "GalileoData=0x10000000",
+                    "QzssData=0x20000000", "SbasData=0x40000000", "LastDataSource=0x80000000"}));
+    QVERIFY(meta.enumerator(meta.indexOfEnumerator("DataSources")).isFlag());
+
+    QStringList properties;
+    for (int i = meta.propertyOffset(); i < meta.propertyCount(); ++i) {
+        const QMetaProperty property = meta.property(i);
+        properties << QStringLiteral("%1 %2 %3")
+                          .arg(QLatin1String(property.name()),
+                               property.isWritable() ? QStringLiteral("rw") : QStringLiteral("r"),
+                               property.isConstant() ? QStringLiteral("constant")
+                                                     : QLatin1String(property.notifySignal().name()));
+    }
+    QCOMPARE(
+        properties,
+        texts({"gpsAvailable r constant", "locationEnabled rw locationEnabledChanged",
+               "gpsEnabled rw gpsEnabledChanged", "gpsFlightMode rw gpsFlightModeChanged",
+               "locationMode rw locationModeChanged", "allowedDataSources rw allowedDataSourcesChanged"}));
 }
 
 int main(int argc, char **argv)

@@ -12,8 +12,11 @@
 
 #include <sched.h>
 #include <sys/mount.h>
+#include <type_traits>
 
 using Corvane::Mdm::SysInfo;
+
+static_assert(std::is_empty_v<SysInfo> && !std::is_polymorphic_v<SysInfo>, "functions alone, and no object");
 
 namespace
 {
