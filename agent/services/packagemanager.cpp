@@ -47,10 +47,11 @@ PackageManager::PackageManager(std::chrono::milliseconds timeout, QObject *paren
     : QObject(parent)
     , m_timeout(timeout)
 {
+    // For a list of strings alone: QtDBus ends the program over another structure.
     QDBusConnection::systemBus().connect(
         Service::packageKit().name, QStringLiteral("/org/freedesktop/PackageKit"),
-        QStringLiteral("org.freedesktop.PackageKit"), QStringLiteral("TransactionListChanged"), this,
-        SLOT(transactionListChanged(QStringList)));
+        QStringLiteral("org.freedesktop.PackageKit"), QStringLiteral("TransactionListChanged"), {},
+        QStringLiteral("as"), this, SLOT(transactionListChanged(QStringList)));
 }
 
 QList<PackageEntry> PackageManager::packages() const
