@@ -497,120 +497,172 @@ std::vector<std::string> argumentsForParser(int argc, char *argv[])
     return arguments;
 }
 
+/** What can be asked for on the command line. The command is chosen when that is right, and run with the
+ * phone. */
+class CommandLine
+{
+public:
+    CommandLine();
+
+    void parse(int argc, char *argv[]);
+    void run(Phone &phone) const { m_chosen(phone); }
+    int finish(const CLI::Success &success) const { return m_app.exit(success); }
+
+private:
+    using Run = std::function<void(Phone &)>;
+
+    CLI::App *add(const char *name, const char *text, const Run &run);
+    CLI::App *addForService(const char *name, const char *text, const Run &run);
+    void addServiceCommands();
+    void addFaultCommands();
+    void addSignalCommand();
+    void addJournalCommand();
+    void addPhoneCommands();
+
+    CLI::App m_app{"Steers the simulated phone that it runs in.", "corvane-simctl"};
+    Run m_chosen;
+    std::string m_service;
+    std::string m_path;
+    std::string m_interface;
+    std::string m_member;
+    std::string m_part;
+    std::vector<std::string> m_words;
+    bool m_json = false;
+    guint32 m_id = 0;
+    FaultOptions m_fault;
+    JournalOptions m_journal;
+};
+
+CommandLine::CommandLine()
+{
+    m_app.footer(examples);
+    m_app.require_subcommand(1);
+    m_app.set_version_flag("--version", CORVANEMDM_VERSION);
+    addServiceCommands();
+    addFaultCommands();
+    addSignalCommand();
+    addJournalCommand();
+    addPhoneCommands();
+}
+
+void CommandLine::parse(int argc, char *argv[])
+{
+    std::vector<std::string> known;
+    for (const CLI::App *command : m_app.get_subcommands({}))
+        known.push_back(command->get_name());
+    if (argc > 1 && argv[1][0] != '-' && std::find(known.begin(), known.end(), argv[1]) == known.end())
+        throw Failure{WrongUsage,
+                      std::string("there is no command \"") + argv[1] + "\"; " + advice(argv[1], known)};
+    m_app.parse(argumentsForParser(argc, argv));
+}
+
+CLI::App *CommandLine::add(const char *name, const char *text, const Run &run)
+{
+    CLI::App *command = m_app.add_subcommand(name, text);
+    command->callback([this, run] { m_chosen = run; });
+    return command;
+}
+
+CLI::App *CommandLine::addForService(const char *name, const char *text, const Run &run)
+{
+    CLI::App *command = add(name, text, run);
+    command->add_option("SERVICE", m_service, "bus name of a service")->required();
+    return command;
+}
+
+void CommandLine::addServiceCommands()
+{
+    const auto order = [this](Phone &phone, const char *method) {
+        requireService(phone, m_service);
+        phone.call(method, g_variant_new("(s)", m_service.c_str()));
+    };
+    add("services", "list the services that can be steered", showServices);
+    addForService("stop", "stop a service, as if it had died",
+                  [order](Phone &phone) { order(phone, "StopService"); });
+    addForService("start", "start a stopped service",
+                  [order](Phone &phone) { order(phone, "StartService"); });
+    addForService("restart", "stop and start a service", [order](Phone &phone) {
+        order(phone, "StopService");
+        order(phone, "StartService");
+    });
+}
+
+void CommandLine::addFaultCommands()
+{
+    CLI::App *setting
+        = m_app.add_subcommand("fault", "make calls of a method fail, come late, never or answer wrongly");
+    setting->callback([this, setting] {
+        m_chosen = [this, setting](Phone &phone) {
+            setFault(phone, *setting, m_fault);
+        };
+    });
+    setting->add_option("KIND", m_fault.kind, "error, late, never or reply")
+        ->required()
+        ->check(CLI::IsMember({"error", "late", "never", "reply"}));
+    setting->add_option("SERVICE", m_fault.service, "bus name of a service")->required();
+    setting->add_option("MEMBER", m_fault.member, "name of the method; \"\" for all")->required();
+    setting->add_option("--path", m_fault.path, "only calls of this object");
+    setting->add_option("--interface", m_fault.interface, "only calls of this interface");
+    setting->add_option("--error", m_fault.error, "error: its name");
+    setting->add_option("--message", m_fault.message, "error: its text");
+    setting->add_option("--delay", m_fault.delay, "late: milliseconds");
+    setting->add_option("--arguments", m_fault.arguments, "reply: the values to answer with")
+        ->type_name("GVARIANT");
+    setting->add_option("--times", m_fault.times, "how many calls to spoil; all unless given");
+    add("faults", "list the faults that are set", showFaults);
+    add("clear-fault", "take a fault back",
+        [this](Phone &phone) { phone.call("ClearFault", g_variant_new("(u)", m_id)); })
+        ->add_option("ID", m_id, "number of the fault")
+        ->required();
+    add("clear-faults", "take all faults back", [](Phone &phone) { phone.call("ClearFaults"); });
+}
+
+void CommandLine::addSignalCommand()
+{
+    CLI::App *emitting = addForService("emit", "emit any signal from a service", [this](Phone &phone) {
+        emitSignal(phone, m_service, m_path, m_interface, m_member, m_words);
+    });
+    emitting->add_option("PATH", m_path, "object that emits it")->required();
+    emitting->add_option("INTERFACE", m_interface, "interface of the signal")->required();
+    emitting->add_option("MEMBER", m_member, "name of the signal")->required();
+    emitting->add_option("VALUE", m_words, "its arguments")->type_name("GVARIANT");
+}
+
+void CommandLine::addJournalCommand()
+{
+    CLI::App *reading = add("journal", "print the calls that the services received",
+                            [this](Phone &phone) { showJournal(phone, m_journal); });
+    reading->add_option("--after", m_journal.after, "only entries after this number");
+    reading->add_option("--service", m_journal.service, "only calls of this service");
+    reading->add_flag("--follow", m_journal.follow, "go on with each new call");
+    reading->add_flag("--json", m_journal.json, "one JSON object a line");
+    reading->add_flag("--secrets", m_journal.secrets, "show passwords as they are, in place of ***");
+    reading->add_flag("--clear", m_journal.clear, "forget all entries instead");
+}
+
+void CommandLine::addPhoneCommands()
+{
+    CLI::App *looking = add("state", "print the state of the phone, or of one part of it",
+                            [this](Phone &phone) { showState(phone, m_part, m_json); });
+    looking->add_option("PART", m_part, "such as sims or softwareUpdate");
+    looking->add_flag("--json", m_json, "as JSON");
+    add("act", "do something to the phone", [this](Phone &phone) { act(phone, m_words); })
+        ->add_option("ACTION", m_words, "words of an action and its arguments; see \"actions\"")
+        ->required();
+    add("actions", "list what can be done to the phone", showActions);
+}
+
 } // namespace
 
 int main(int argc, char *argv[])
 {
-    CLI::App app("Steers the simulated phone that it runs in.", "corvane-simctl");
-    app.footer(examples);
-    app.require_subcommand(1);
-    app.set_version_flag("--version", CORVANEMDM_VERSION);
-
-    std::string service;
-    std::string path;
-    std::string interface;
-    std::string member;
-    std::string part;
-    std::vector<std::string> words;
-    bool json = false;
-    guint32 id = 0;
-    FaultOptions fault;
-    JournalOptions journal;
-
-    // Bound when the command line is right, run when the phone is there.
-    std::function<void(Phone &)> chosen;
-    const auto add = [&](const char *name, const char *text, std::function<void(Phone &)> run) {
-        CLI::App *command = app.add_subcommand(name, text);
-        command->callback([&chosen, run] { chosen = run; });
-        return command;
-    };
-    const auto forService = [&](CLI::App *command) {
-        command->add_option("SERVICE", service, "bus name of a service")->required();
-    };
-
-    add("services", "list the services that can be steered", showServices);
-    forService(add("stop", "stop a service, as if it had died", [&](Phone &phone) {
-        requireService(phone, service);
-        phone.call("StopService", g_variant_new("(s)", service.c_str()));
-    }));
-    forService(add("start", "start a stopped service", [&](Phone &phone) {
-        requireService(phone, service);
-        phone.call("StartService", g_variant_new("(s)", service.c_str()));
-    }));
-    forService(add("restart", "stop and start a service", [&](Phone &phone) {
-        requireService(phone, service);
-        phone.call("StopService", g_variant_new("(s)", service.c_str()));
-        phone.call("StartService", g_variant_new("(s)", service.c_str()));
-    }));
-
-    CLI::App *setting
-        = app.add_subcommand("fault", "make calls of a method fail, come late, never or answer wrongly");
-    setting->callback([&] {
-        chosen = [&](Phone &phone) {
-            setFault(phone, *setting, fault);
-        };
-    });
-    setting->add_option("KIND", fault.kind, "error, late, never or reply")
-        ->required()
-        ->check(CLI::IsMember({"error", "late", "never", "reply"}));
-    setting->add_option("SERVICE", fault.service, "bus name of a service")->required();
-    setting->add_option("MEMBER", fault.member, "name of the method; \"\" for all")->required();
-    setting->add_option("--path", fault.path, "only calls of this object");
-    setting->add_option("--interface", fault.interface, "only calls of this interface");
-    setting->add_option("--error", fault.error, "error: its name");
-    setting->add_option("--message", fault.message, "error: its text");
-    setting->add_option("--delay", fault.delay, "late: milliseconds");
-    setting->add_option("--arguments", fault.arguments, "reply: the values to answer with")
-        ->type_name("GVARIANT");
-    setting->add_option("--times", fault.times, "how many calls to spoil; all unless given");
-    add("faults", "list the faults that are set", showFaults);
-    add("clear-fault", "take a fault back",
-        [&](Phone &phone) { phone.call("ClearFault", g_variant_new("(u)", id)); })
-        ->add_option("ID", id, "number of the fault")
-        ->required();
-    add("clear-faults", "take all faults back", [](Phone &phone) { phone.call("ClearFaults"); });
-
-    CLI::App *emitting = add("emit", "emit any signal from a service", [&](Phone &phone) {
-        emitSignal(phone, service, path, interface, member, words);
-    });
-    forService(emitting);
-    emitting->add_option("PATH", path, "object that emits it")->required();
-    emitting->add_option("INTERFACE", interface, "interface of the signal")->required();
-    emitting->add_option("MEMBER", member, "name of the signal")->required();
-    emitting->add_option("VALUE", words, "its arguments")->type_name("GVARIANT");
-
-    CLI::App *reading = add("journal", "print the calls that the services received",
-                            [&](Phone &phone) { showJournal(phone, journal); });
-    reading->add_option("--after", journal.after, "only entries after this number");
-    reading->add_option("--service", journal.service, "only calls of this service");
-    reading->add_flag("--follow", journal.follow, "go on with each new call");
-    reading->add_flag("--json", journal.json, "one JSON object a line");
-    reading->add_flag("--secrets", journal.secrets, "show passwords as they are, in place of ***");
-    reading->add_flag("--clear", journal.clear, "forget all entries instead");
-
-    CLI::App *looking = add("state", "print the state of the phone, or of one part of it",
-                            [&](Phone &phone) { showState(phone, part, json); });
-    looking->add_option("PART", part, "such as sims or softwareUpdate");
-    looking->add_flag("--json", json, "as JSON");
-
-    add("act", "do something to the phone", [&](Phone &phone) { act(phone, words); })
-        ->add_option("ACTION", words, "words of an action and its arguments; see \"actions\"")
-
-        ->required();
-    add("actions", "list what can be done to the phone", showActions);
-
+    CommandLine commandLine;
     try {
-        std::vector<std::string> known;
-        for (const CLI::App *command : app.get_subcommands({}))
-            known.push_back(command->get_name());
-        if (argc > 1 && argv[1][0] != '-' && std::find(known.begin(), known.end(), argv[1]) == known.end())
-            throw Failure{WrongUsage,
-                          std::string("there is no command \"") + argv[1] + "\"; " + advice(argv[1], known)};
-        app.parse(argumentsForParser(argc, argv));
+        commandLine.parse(argc, argv);
         Phone phone;
-        chosen(phone);
+        commandLine.run(phone);
     } catch (const CLI::Success &success) {
-        return app.exit(success);
+        return commandLine.finish(success);
     } catch (const CLI::ParseError &error) {
         std::fprintf(stderr, "corvane-simctl: %s; see corvane-simctl --help\n", error.what());
         return WrongUsage;
