@@ -1,6 +1,7 @@
 // SPDX-License-Identifier: LGPL-2.1-or-later
 #include "ofonobus.h"
 #include "phone.h"
+#include "texts.h"
 #include "waiting.h"
 
 #include <QtCore/QDir>
@@ -18,14 +19,6 @@ const QString secondImsi = QStringLiteral("262021234567891");
 const QString choiceFile = QStringLiteral("/var/lib/ofono/veldmobile-sims");
 const QString refused = QStringLiteral("error org.ofono.Error.InvalidArguments");
 const QString unknown = QStringLiteral("error org.freedesktop.DBus.Error.UnknownMethod");
-
-QStringList texts(std::initializer_list<const char *> list)
-{
-    QStringList result;
-    for (const char *text : list)
-        result << QString::fromUtf8(text);
-    return result;
-}
 
 QString ask(const char *member)
 {

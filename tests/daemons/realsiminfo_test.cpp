@@ -1,6 +1,7 @@
 // SPDX-License-Identifier: LGPL-2.1-or-later
 #include "ofonobus.h"
 #include "phone.h"
+#include "texts.h"
 #include "waiting.h"
 
 #include <corvanemdm/siminfo.h>
@@ -20,14 +21,6 @@ using Corvane::Mdm::SimInfo;
 
 namespace
 {
-
-QStringList texts(std::initializer_list<const char *> list)
-{
-    QStringList result;
-    for (const char *text : list)
-        result << QString::fromUtf8(text);
-    return result;
-}
 
 const char firstSlot[]
     = "SimState(/ril_0), imsi: 244051234567890, present: true, voice SIM: true, data SIM: true, "

@@ -2,6 +2,7 @@
 #include "messagelog.h"
 #include "phone.h"
 #include "signalsequence.h"
+#include "texts.h"
 #include "waiting.h"
 
 #include <corvanemdm/applications.h>
@@ -24,14 +25,6 @@ namespace
 
 const QString Service = QStringLiteral("org.freedesktop.PackageKit");
 const QString EntryFolder = QStringLiteral("/usr/share/applications/");
-
-QStringList texts(std::initializer_list<const char *> list)
-{
-    QStringList result;
-    for (const char *text : list)
-        result.append(QString::fromUtf8(text));
-    return result;
-}
 
 /** "name version vendor" of each, in the order of the database. */
 QStringList packageTexts(const QList<PackageEntry> &packages)

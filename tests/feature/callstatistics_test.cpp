@@ -2,6 +2,7 @@
 #include "messagelog.h"
 #include "phone.h"
 #include "signalsequence.h"
+#include "texts.h"
 #include "waiting.h"
 
 #include <corvanemdm/callstatistics.h>
@@ -57,14 +58,6 @@ QDateTime utc(const char *text)
 QVariant wire(const QList<WireResult> &results)
 {
     return QVariant::fromValue(results);
-}
-
-QStringList texts(std::initializer_list<const char *> list)
-{
-    QStringList result;
-    for (const char *text : list)
-        result.append(QString::fromUtf8(text));
-    return result;
 }
 
 } // namespace

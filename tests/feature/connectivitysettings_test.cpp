@@ -2,14 +2,14 @@
 #include "messagelog.h"
 #include "phone.h"
 #include "signalsequence.h"
+#include "texts.h"
 #include "waiting.h"
+#include "wireobject.h"
 
 #include <corvanemdm/connectivitysettings.h>
 
 #include <QtCore/QJsonArray>
 #include <QtCore/QProcess>
-#include <QtDBus/QDBusArgument>
-#include <QtDBus/QDBusMetaType>
 #include <QtDBus/QDBusObjectPath>
 #include <QtDBus/QDBusVariant>
 #include <QtTest/QtTest>
@@ -19,29 +19,6 @@
 using Corvane::Mdm::ConnectivitySettings;
 using AccessPoint = ConnectivitySettings::MobileNetworkAccessPointSettings;
 using Technologies = ConnectivitySettings::CellularTechnologies;
-
-/** An object as the services list it. */
-struct WireObject {
-    QDBusObjectPath path;
-    QVariantMap properties;
-};
-Q_DECLARE_METATYPE(WireObject)
-
-QDBusArgument &operator<<(QDBusArgument &out, const WireObject &object)
-{
-    out.beginStructure();
-    out << object.path << object.properties;
-    out.endStructure();
-    return out;
-}
-
-const QDBusArgument &operator>>(const QDBusArgument &in, WireObject &object)
-{
-    in.beginStructure();
-    in >> object.path >> object.properties;
-    in.endStructure();
-    return in;
-}
 
 namespace
 {
@@ -66,14 +43,6 @@ const QString UnknownImsi = QStringLiteral("999991234567890");
 const QString FirstContext = QStringLiteral("/ril_0/context1");
 const QString MmsContext = QStringLiteral("/ril_0/context2");
 const QString FirstService = QStringLiteral("/net/connman/service/cellular_244051234567890_context1");
-
-QStringList texts(std::initializer_list<const char *> list)
-{
-    QStringList result;
-    for (const char *text : list)
-        result.append(QString::fromUtf8(text));
-    return result;
-}
 
 QVariant variantOf(const QVariant &value)
 {
@@ -245,8 +214,7 @@ private:
 
 void ConnectivitySettingsTest::initTestCase()
 {
-    qDBusRegisterMetaType<WireObject>();
-    qDBusRegisterMetaType<QList<WireObject>>();
+    WireObject::registerTypes();
 }
 
 void ConnectivitySettingsTest::init()

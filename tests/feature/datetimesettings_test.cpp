@@ -2,6 +2,7 @@
 #include "messagelog.h"
 #include "phone.h"
 #include "signalsequence.h"
+#include "texts.h"
 #include "waiting.h"
 
 #include <corvanemdm/datetimesettings.h>
@@ -25,14 +26,6 @@ const QString Service = QStringLiteral("org.freedesktop.timedate1");
 const QString Path = QStringLiteral("/org/freedesktop/timedate1");
 const QString FileName = QStringLiteral("/etc/datetime/datetime.conf");
 const QString ZoneTable = QStringLiteral("/usr/share/zoneinfo/zone.tab");
-
-QStringList texts(std::initializer_list<const char *> list)
-{
-    QStringList result;
-    for (const char *text : list)
-        result.append(QString::fromLatin1(text));
-    return result;
-}
 
 void write(const QString &fileName, const QByteArray &content)
 {

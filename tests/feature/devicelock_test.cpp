@@ -2,6 +2,7 @@
 #include "messagelog.h"
 #include "phone.h"
 #include "signalsequence.h"
+#include "texts.h"
 #include "waiting.h"
 
 #include <corvanemdm/devicelock.h>
@@ -30,14 +31,6 @@ const QString ClearDevice = QStringLiteral("ClearDevice");
 const QString SetLockoutMode = QStringLiteral("SetLockoutMode");
 const QString SetSecurityCode = QStringLiteral("SetSecurityCode");
 const QString Code = QStringLiteral("2468");
-
-QStringList texts(std::initializer_list<const char *> list)
-{
-    QStringList result;
-    for (const char *text : list)
-        result.append(QString::fromUtf8(text));
-    return result;
-}
 
 /** One of the three commands, seen from outside. */
 struct Command {

@@ -2,6 +2,7 @@
 #include "messagelog.h"
 #include "phone.h"
 #include "signalsequence.h"
+#include "texts.h"
 #include "waiting.h"
 
 #include <corvanemdm/locationinfo.h>
@@ -26,14 +27,6 @@ const QString Path = QStringLiteral("/Corvane/Mdm/Proxy/LocationInfo");
 const QString Interface = QStringLiteral("org.corvaneos.mdmproxy.locationinfo");
 
 const QString Failed = QStringLiteral("QDBusError(\"com.example.Broken\", \"Out of order\")");
-
-QStringList texts(std::initializer_list<const char *> list)
-{
-    QStringList result;
-    for (const char *text : list)
-        result.append(QString::fromLatin1(text));
-    return result;
-}
 
 /** "latitude longitude altitude milliseconds", "none" without a time. */
 QString textOf(const LocationInfo::Position &position)

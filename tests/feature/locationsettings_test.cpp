@@ -1,6 +1,7 @@
 // SPDX-License-Identifier: LGPL-2.1-or-later
 #include "messagelog.h"
 #include "signalsequence.h"
+#include "texts.h"
 #include "waiting.h"
 
 #include <corvanemdm/locationsettings.h>
@@ -24,14 +25,6 @@ const QString FileName = QStringLiteral("/etc/location/location.conf");
 const QString Here = QStringLiteral("here");
 const QString Mls = QStringLiteral("mls");
 const QString Unknown = QStringLiteral("No such aGPS provider: \"skyhook\"");
-
-QStringList texts(std::initializer_list<const char *> list)
-{
-    QStringList result;
-    for (const char *text : list)
-        result.append(QString::fromLatin1(text));
-    return result;
-}
 
 /** Writes the file as an editor does, or another program. */
 void write(const QByteArray &content)

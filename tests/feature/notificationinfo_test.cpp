@@ -1,6 +1,7 @@
 // SPDX-License-Identifier: LGPL-2.1-or-later
 #include "messagelog.h"
 #include "phone.h"
+#include "texts.h"
 #include "wirenotification.h"
 
 #include <corvanemdm/notificationinfo.h>
@@ -70,14 +71,6 @@ constexpr int deepestShape = 6;
 template <typename T> QVariant variant(const T &value)
 {
     return QVariant::fromValue(value);
-}
-
-QStringList texts(std::initializer_list<const char *> list)
-{
-    QStringList result;
-    for (const char *text : list)
-        result.append(QString::fromLatin1(text));
-    return result;
 }
 
 QString call(const char *member, const QString &arguments)

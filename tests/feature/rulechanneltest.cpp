@@ -11,22 +11,6 @@
 #include <QtDBus/QDBusMetaType>
 #include <QtTest/QtTest>
 
-QDBusArgument &operator<<(QDBusArgument &out, const WireRule &rule)
-{
-    out.beginStructure();
-    out << rule.imsi << rule.action;
-    out.endStructure();
-    return out;
-}
-
-const QDBusArgument &operator>>(const QDBusArgument &in, WireRule &rule)
-{
-    in.beginStructure();
-    in >> rule.imsi >> rule.action;
-    in.endStructure();
-    return in;
-}
-
 QVariant wire(const char *imsi, quint32 action)
 {
     return QVariant::fromValue(wireRule(imsi, action));
@@ -45,14 +29,6 @@ WireRule wireRule(const char *imsi, quint32 action)
 Rule rule(const char *imsi, SimFilter::Action action)
 {
     return Rule(QString::fromUtf8(imsi), action);
-}
-
-QStringList texts(std::initializer_list<const char *> list)
-{
-    QStringList result;
-    for (const char *text : list)
-        result.append(QString::fromUtf8(text));
-    return result;
 }
 
 QString TestedChannel::wireName(const char *pattern) const

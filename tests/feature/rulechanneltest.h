@@ -3,12 +3,13 @@
 #define CORVANE_RULECHANNELTEST_H
 
 #include "phone.h"
+#include "texts.h"
+#include "wirerule.h"
 
 #include <corvanemdm/simfilter.h>
 
 #include <QtCore/QObject>
 #include <QtCore/QVector>
-#include <QtDBus/QDBusArgument>
 
 #include <functional>
 #include <memory>
@@ -17,20 +18,10 @@ using Corvane::Mdm::SimFilter;
 using Rule = SimFilter::Rule;
 using RuleList = SimFilter::RuleList;
 
-/** A rule as the service sends it: any number may stand for the action. */
-struct WireRule {
-    QString imsi;
-    quint32 action = 0;
-};
-Q_DECLARE_METATYPE(WireRule)
-QDBusArgument &operator<<(QDBusArgument &out, const WireRule &rule);
-const QDBusArgument &operator>>(const QDBusArgument &in, WireRule &rule);
-
 QVariant wire(const char *imsi, quint32 action);
 QVariant wire(const QList<WireRule> &rules);
 WireRule wireRule(const char *imsi, quint32 action);
 Rule rule(const char *imsi, SimFilter::Action action);
-QStringList texts(std::initializer_list<const char *> list);
 
 /** How one kind of traffic is called, by the service and by the filter. */
 struct ChannelNames {

@@ -2,6 +2,7 @@
 #include "messagelog.h"
 #include "phone.h"
 #include "signalsequence.h"
+#include "texts.h"
 #include "waiting.h"
 
 #include <corvanemdm/softwareupdate.h>
@@ -25,14 +26,6 @@ QString call(const char *member, const char *arguments = "()")
 {
     return Path + QLatin1Char(' ') + QLatin1String(member) + QLatin1Char(' ')
         + QString::fromLatin1(arguments);
-}
-
-QStringList texts(std::initializer_list<const char *> list)
-{
-    QStringList result;
-    for (const char *text : list)
-        result.append(QString::fromUtf8(text));
-    return result;
 }
 
 } // namespace

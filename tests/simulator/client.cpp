@@ -11,22 +11,6 @@
 #include <QtDBus/QDBusPendingCallWatcher>
 #include <QtDBus/QDBusVariant>
 
-QDBusArgument &operator<<(QDBusArgument &out, const WireRule &rule)
-{
-    out.beginStructure();
-    out << rule.imsi << rule.action;
-    out.endStructure();
-    return out;
-}
-
-const QDBusArgument &operator>>(const QDBusArgument &in, WireRule &rule)
-{
-    in.beginStructure();
-    in >> rule.imsi >> rule.action;
-    in.endStructure();
-    return in;
-}
-
 namespace
 {
 

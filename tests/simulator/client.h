@@ -2,24 +2,14 @@
 #ifndef CORVANE_TEST_CLIENT_H
 #define CORVANE_TEST_CLIENT_H
 
+#include "wirerule.h"
+
 #include <QtCore/QObject>
 #include <QtCore/QStringList>
 #include <QtCore/QVariantList>
-#include <QtDBus/QDBusArgument>
 #include <QtDBus/QDBusConnection>
 #include <QtDBus/QDBusError>
 #include <QtDBus/QDBusMessage>
-
-/** A rule as the wire has it. */
-struct WireRule {
-    QString imsi;
-    quint32 action;
-};
-Q_DECLARE_METATYPE(WireRule)
-QDBusArgument &operator<<(QDBusArgument &out, const WireRule &rule);
-const QDBusArgument &operator>>(const QDBusArgument &in, WireRule &rule);
-using WireRules = QList<WireRule>;
-Q_DECLARE_METATYPE(WireRules)
 
 /**
  * A client of the phone's bus with a connection of its own, which knows nothing but messages.

@@ -1,5 +1,6 @@
 // SPDX-License-Identifier: LGPL-2.1-or-later
 #include "client.h"
+#include "texts.h"
 
 #include <QtDBus/QDBusObjectPath>
 #include <QtDBus/QDBusVariant>
@@ -24,14 +25,6 @@ QString contextText(const char *active, const char *apn, const char *type, const
                           "Protocol=<ip>, AuthenticationMethod=<none>, Name=<%4>, MessageCenter=<>, "
                           "MessageProxy=<>}")
         .arg(QLatin1String(active), QLatin1String(apn), QLatin1String(type), QLatin1String(name));
-}
-
-QStringList texts(std::initializer_list<const char *> list)
-{
-    QStringList result;
-    for (const char *text : list)
-        result.append(QString::fromUtf8(text));
-    return result;
 }
 
 } // namespace

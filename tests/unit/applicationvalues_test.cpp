@@ -1,5 +1,6 @@
 // SPDX-License-Identifier: LGPL-2.1-or-later
 #include "signalsequence.h"
+#include "texts.h"
 #include "waiting.h"
 
 #include <corvanemdm/applications.h>
@@ -13,19 +14,6 @@ using Corvane::Mdm::ApplicationEntry;
 using Corvane::Mdm::ApplicationOperation;
 using Corvane::Mdm::Applications;
 using Corvane::Mdm::PackageEntry;
-
-namespace
-{
-
-QStringList texts(std::initializer_list<const char *> list)
-{
-    QStringList result;
-    for (const char *text : list)
-        result.append(QLatin1String(text));
-    return result;
-}
-
-} // namespace
 
 using Signal = void (ApplicationOperation::*)(ApplicationOperation *);
 Q_DECLARE_METATYPE(Signal)
