@@ -36,7 +36,7 @@ Modem *SimSlots::find(const std::string &path)
 bool SimSlots::hasSim(const std::string &imsi) const
 {
     return !imsi.empty() && std::any_of(modems.begin(), modems.end(), [&](const auto &each) {
-        return each.second.announcedImsi() == imsi;
+        return each.second.imsi == imsi;
     });
 }
 

@@ -66,6 +66,7 @@ public:
 
     Modem *find(const std::string &path);
     bool isEnabled(const std::string &path) const { return choice.disabledModems.count(path) == 0; }
+    /** Whether it is in the phone, announced or not. */
     bool hasSim(const std::string &imsi) const;
     /** @p choice with exactly @p enabled enabled among the modems that are there. */
     Choice choiceWithEnabled(const std::vector<std::string> &enabled) const;

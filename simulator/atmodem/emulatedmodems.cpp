@@ -101,6 +101,7 @@ public:
 private:
     struct Step {
         QString missing; ///< what the modem lacks, for people; empty when it is up
+        bool isSwitchedOn = false; ///< or has refused to be: what it is counts from then on
         bool isExamined = false;
         bool isStale = false; ///< something changed while it was examined
     };
@@ -121,7 +122,7 @@ private:
 EmulatedModems::BringUp::BringUp(const Phone &phone, std::function<void()> done)
     : m_phone(phone)
     , m_done(std::move(done))
-    , m_steps(phone.sims.size(), {QStringLiteral("is not powered"), false, false})
+    , m_steps(phone.sims.size(), {QStringLiteral("is not powered"), false, false, false})
 {
     m_connection.watchSignal(Ofono::serviceName, QStringLiteral("PropertyChanged"),
                              [this](const QString &path) {
@@ -134,6 +135,7 @@ EmulatedModems::BringUp::BringUp(const Phone &phone, std::function<void()> done)
         set(slot, "Powered", [this, slot] {
             set(slot, "Online", [this, slot] {
                 m_steps[slot].missing = QStringLiteral("is not examined");
+                m_steps[slot].isSwitchedOn = true;
                 examine(slot);
             });
         });
@@ -159,6 +161,7 @@ void EmulatedModems::BringUp::set(std::size_t slot, const char *property, std::f
                               m_steps[slot].missing = QStringLiteral("refused to be %1 (%2)")
                                                           .arg(QString::fromLatin1(property).toLower(),
                                                                QString::fromUtf8(error->message));
+                              m_steps[slot].isSwitchedOn = true;
                               return;
                           }
                           next();
@@ -177,7 +180,7 @@ void EmulatedModems::BringUp::getProperties(std::size_t slot, QLatin1String inte
 void EmulatedModems::BringUp::examine(std::size_t slot)
 {
     Step &step = m_steps[slot];
-    if (step.missing.isEmpty())
+    if (!step.isSwitchedOn || step.missing.isEmpty())
         return;
     step.isStale = step.isExamined;
     if (step.isExamined)

@@ -350,9 +350,9 @@ void RealMobileDataTest::restarts()
     QVERIFY(!settings.connectToMobileNetwork(Imsi));
     const QStringList warnings = m_log->takeWarnings();
     QVERIFY(!warnings.isEmpty());
-    // ConnMan takes the modems' power along when it goes.
+    // ConnMan takes the modems' power along when it goes, and gives it back one by one.
     m_phone.startService(daemon);
-    QVERIFY(waitUntil(hasService));
+    QVERIFY(waitUntil([] { return isCellular(true); }));
     QVERIFY(settings.connectToMobileNetwork(Imsi));
     QVERIFY(settings.isConnectedToMobileNetwork(Imsi));
     QVERIFY(settings.disconnectFromMobileNetwork(Imsi));
