@@ -91,6 +91,11 @@ Client::Client(Connection connection)
 
 Client::~Client()
 {
+    // What is still on its way over the shared connection would be the next client's.
+    if (m_connectionName.isEmpty()) {
+        for (const QString &service : qAsConst(m_watched))
+            takeSignals(service);
+    }
     // QtDBus corrupts memory when a connection is closed under a call that is still waited for.
     qDeleteAll(findChildren<QDBusPendingCallWatcher *>());
     if (m_isPeer)
@@ -154,6 +159,7 @@ void Client::callAndNote(const QString &service, const QString &path, const QStr
 void Client::watch(const QString &service, const QString &path, const QString &interface,
                    const QStringList &members)
 {
+    m_watched.insert(service);
     for (const QString &member : members) {
         if (!m_connection.connect(service, path, interface, member, this, SLOT(note(QDBusMessage))))
             qFatal("cannot watch %s", qPrintable(member));

@@ -5,6 +5,7 @@
 #include "wirerule.h"
 
 #include <QtCore/QObject>
+#include <QtCore/QSet>
 #include <QtCore/QStringList>
 #include <QtCore/QVariantList>
 #include <QtDBus/QDBusConnection>
@@ -63,6 +64,7 @@ private:
     const QString m_connectionName; ///< empty: shared
     const bool m_isPeer;
     QDBusConnection m_connection;
+    QSet<QString> m_watched; ///< services
     QStringList m_signals;
 };
 
