@@ -75,6 +75,11 @@ processes_in() { # PID_NAMESPACE
     done
 }
 
+# Keeps the number of a namespace from being given to another phone as soon as this one is gone.
+keep_namespace() { # PID_NAMESPACE
+    exec 6<"$(processes_in "$1" | head -n 1)/ns/pid"
+}
+
 # Runs a phone in the background; its command says on fd 8 when it is ready, and waits for a line on fd 9.
 # fd 7 is held by every process of the phone, so that its end of file tells that none is left.
 hold_phone() { # NAME COMMAND
@@ -220,9 +225,14 @@ signals_reach_the_command() {
 
 nothing_survives() {
     local namespace
-    namespace=$(phone sh -c 'sleep 1000 >/dev/null 2>&1 & setsid sleep 1000 >/dev/null 2>&1 & readlink /proc/self/ns/pid')
+    hold_phone busy 'sleep 1000 & setsid sleep 1000 & readlink /proc/self/ns/pid >&8; exec 8>&-; read -r _ <&9'
+    read -r namespace <"$work/busy.ready"
     expect_match "namespace" "$namespace" '^pid:'
+    keep_namespace "$namespace"
+    echo >"$work/busy.go"
+    wait $held
     expect "processes" "$(processes_in "$namespace")" ""
+    exec 6<&-
 }
 
 kill_takes_everything_down() {
@@ -231,6 +241,7 @@ kill_takes_everything_down() {
     exec 5<"$work/killed.alive"
     read -r namespace <"$work/killed.ready"
     [[ $(processes_in "$namespace" | wc -l) -ge 4 ]] || fail "not enough processes seen in the phone"
+    keep_namespace "$namespace"
     kill -KILL $held
     timeout 60 cat <&5 || fail "the phone lives on"
     exec 5<&-
@@ -238,6 +249,7 @@ kill_takes_everything_down() {
     # The files are closed a moment before the process table is cleared.
     while [[ -n $(processes_in "$namespace") && $SECONDS -lt 120 ]]; do :; done
     expect "processes" "$(processes_in "$namespace")" ""
+    exec 6<&-
 }
 
 two_phones_are_apart() {
