@@ -205,7 +205,7 @@ void NetProxyPrivate::onGetPropertyFinishedActive(QDBusPendingCallWatcher *watch
     const QVariant value = reply.value().variant();
     bool isRead = false;
     if (value.userType() == QMetaType::Bool)
-        isRead = global->activeWasAnnounced || global->applyActive(value.toBool());
+        isRead = global->applyActive(value.toBool());
     else
         qDebug() << "MDM Proxy: incorrect return type for Action query";
     setValidGlobalActive(isRead);
@@ -221,9 +221,9 @@ void NetProxyPrivate::onGetPropertyFinishedConfiguration(QDBusPendingCallWatcher
     }
     const QVariant value = reply.value().variant();
     const auto configuration = toDictionary(value);
-    if (configuration && !global->configurationWasAnnounced)
+    if (configuration)
         global->applyConfiguration(*configuration);
-    else if (!configuration)
+    else
         qDebug() << "MDM Proxy: incorrect type: " << value.typeName();
     setValidGlobalConfig(configuration.has_value());
 }
@@ -241,7 +241,6 @@ void NetProxyPrivate::onPropertyChanged(const QString &name, const QDBusVariant 
 void NetProxyPrivate::activeChanged(bool isActive)
 {
     const QPointer<NetProxyPrivate> alive(this);
-    global->activeWasAnnounced = true;
     global->applyActive(isActive);
     Q_EMIT q->activeTypeChanged(isActive ? NetProxy::Global : NetProxy::Service);
     if (alive && selection == SelectedGlobal)
@@ -259,7 +258,6 @@ void NetProxyPrivate::configurationChanged(const QVariant &value)
         qDebug() << "MDM Proxy: property change: incorrect type: " << value.typeName();
         return;
     }
-    global->configurationWasAnnounced = true;
     const quint32 changes = global->applyConfiguration(*configuration);
     if (changes && selection == SelectedGlobal)
         announce(*global, changes);

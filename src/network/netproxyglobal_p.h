@@ -28,9 +28,6 @@ public:
     bool setActive(bool isActive);
 
     bool active = false; ///< whether it is used in place of those of the networks
-    // Signals may overtake the answers to the first questions: what was announced before them is not older.
-    bool activeWasAnnounced = false;
-    bool configurationWasAnnounced = false;
     GlobalProxyInterfaceProxy *proxy;
 
 protected:

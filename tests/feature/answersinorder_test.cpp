@@ -6,7 +6,6 @@
 
 #include <corvanemdm/datetimesettings.h>
 #include <corvanemdm/devicelock.h>
-#include <corvanemdm/netproxy.h>
 #include <corvanemdm/simvoicecallfilter.h>
 
 #include <ofono/qofonosimmanager.h>
@@ -23,7 +22,6 @@
 
 using Corvane::Mdm::DateTimeSettings;
 using Corvane::Mdm::DeviceLock;
-using Corvane::Mdm::NetProxy;
 using Corvane::Mdm::SimFilter;
 using Corvane::Mdm::SimVoiceCallFilter;
 
@@ -54,7 +52,6 @@ private Q_SLOTS:
 
     void simManager();
     void callFilter();
-    void globalProxy();
     void timeZone();
     void lockState();
 
@@ -120,25 +117,6 @@ void AnswersInOrderTest::callFilter()
     QVERIFY(waitUntil([&] { return filter.ready(); }));
     m_phone.settle(service);
     QCOMPARE(filter.defaultDialAction(), SimFilter::Block);
-}
-
-void AnswersInOrderTest::globalProxy()
-{
-    const QString service = QStringLiteral("net.connman");
-    NetProxy proxy;
-    const auto change = [&](const char *property, const QVariant &value) {
-        announce(service, QStringLiteral("/"), QStringLiteral("org.corvaneos.connman.GlobalProxy"),
-                 QStringLiteral("PropertyChanged"),
-                 {QLatin1String(property), QVariant::fromValue(QDBusVariant(value))});
-    };
-    change("Active", true);
-    change("Configuration",
-           QVariantMap{{QStringLiteral("Method"), QStringLiteral("auto")},
-                       {QStringLiteral("URL"), QStringLiteral("http://wpad.example/proxy.pac")}});
-    QVERIFY(waitUntil([&] { return proxy.isValid(); }));
-    m_phone.settle(service);
-    QCOMPARE(proxy.activeType(), NetProxy::Global);
-    QCOMPARE(proxy.type(), NetProxy::Automatic);
 }
 
 void AnswersInOrderTest::timeZone()
