@@ -72,6 +72,7 @@ private Q_SLOTS:
     void becomesValidWithTheGlobalProxy();
     void keepsAnEarlierSelection();
     void firstReadingIsSilent();
+    void firstReadingStandsUntilTheNextAnnouncement();
     void announcementsMakeItValid();
     void withoutTheConnectionManager();
     void globalProxyThatCannotBeRead_data();
@@ -313,6 +314,19 @@ void NetProxyTest::firstReadingIsSilent()
     QCOMPARE(seen.take(), list("validChanged(true)"));
     QCOMPARE(proxy.manualProxies(), urls("http://first:1"));
     QCOMPARE(proxy.activeType(), NetProxy::Global);
+}
+
+void NetProxyTest::firstReadingStandsUntilTheNextAnnouncement()
+{
+    // Late enough for what is announced meanwhile.
+    m_phone->delayCalls(Service, Root, QStringLiteral("GetProperty"), 2000);
+    NetProxy proxy;
+    SignalSequence seen(&proxy);
+    propertyChanged("Active", true);
+    QCOMPARE(proxy.activeType(), NetProxy::Global);
+    QVERIFY(waitUntil([&] { return proxy.isValid(); }));
+    QCOMPARE(proxy.activeType(), NetProxy::Service);
+    QCOMPARE(seen.take(), list("activeTypeChanged(Global)|validChanged(true)"));
 }
 
 void NetProxyTest::announcementsMakeItValid()
