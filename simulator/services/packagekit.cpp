@@ -139,7 +139,7 @@ void PackageKit::attach(Service &service)
     service.watchClients([this](const QString &client) {
         const auto transactions = m_transactions;
         for (const auto &[path, transaction] : transactions) {
-            if (transaction->client() == client && !transaction->isFinished())
+            if (transaction->client() == client && transaction->isCancellable())
                 finish(transaction, PackageTransaction::Cancelled);
         }
     });

@@ -118,7 +118,7 @@ void PackageTransaction::setHints(const QString &client, const QStringList &hint
 void PackageTransaction::checkCancellable(const QString &client) const
 {
     checkClient(client);
-    if (!isBegun() || isFinished() || !m_cancellable)
+    if (!isBegun() || !isCancellable())
         throw invalidState(QStringLiteral("The transaction cannot be cancelled now"));
 }
 

@@ -42,6 +42,8 @@ public:
     QString client() const { return m_client; }
     bool isBegun() const { return m_role != UnknownRole; }
     bool isFinished() const { return m_status == FinishedStatus; }
+    /** Whether it can still be given up. */
+    bool isCancellable() const { return !isFinished() && m_cancellable; }
     guint32 percentage() const { return m_percentage; }
     /** For what the transaction does next. */
     Timer &timer() { return m_timer; }

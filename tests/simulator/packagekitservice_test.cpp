@@ -78,6 +78,7 @@ private Q_SLOTS:
     void transactionBelongsToItsClient();
     void cancels();
     void clientThatLeavesCancels();
+    void clientThatLeavesTooLateCancelsNothing();
     void transactionTellsItsProgress();
     void transactionVanishes();
     void stopForgetsTransactions();
@@ -85,12 +86,13 @@ private Q_SLOTS:
     void stateListsPackages();
 
 private:
-    QString create() const;
+    static QString create(const Client &client);
     /** Watches what tells of @p transaction. */
     void watch(const QString &transaction);
     /** Sends the request and waits for the end: what was told, but for the runtime. */
     QStringList perform(const QString &method, const QVariantList &arguments, bool plural = true);
-    QStringList waitForEnd();
+    /** The signals after @p told until the transaction has ended, and @p told before them. */
+    QStringList waitForEnd(QStringList told = {});
     QStringList install(const QStringList &packages, quint64 flags = onlyTrusted)
     {
         return perform(QStringLiteral("InstallPackages"), {flags, packages});
@@ -120,9 +122,9 @@ void PackageKitServiceTest::cleanup()
     m_client.reset();
 }
 
-QString PackageKitServiceTest::create() const
+QString PackageKitServiceTest::create(const Client &client)
 {
-    const QDBusMessage reply = m_client->call(service, path, interface, QStringLiteral("CreateTransaction"));
+    const QDBusMessage reply = client.call(service, path, interface, QStringLiteral("CreateTransaction"));
     return qvariant_cast<QDBusObjectPath>(reply.arguments().value(0)).path();
 }
 
@@ -132,9 +134,8 @@ void PackageKitServiceTest::watch(const QString &transaction)
                     ids({"Package", "Packages", "ErrorCode", "Finished"}));
 }
 
-QStringList PackageKitServiceTest::waitForEnd()
+QStringList PackageKitServiceTest::waitForEnd(QStringList told)
 {
-    QStringList told;
     const bool ended = waitUntil([&] {
         told += m_client->takeSignals(service);
         return !told.isEmpty() && told.last().startsWith(QLatin1String("Finished("));
@@ -148,7 +149,7 @@ QStringList PackageKitServiceTest::waitForEnd()
 
 QStringList PackageKitServiceTest::perform(const QString &method, const QVariantList &arguments, bool plural)
 {
-    const QString transaction = create();
+    const QString transaction = create(*m_client);
     watch(transaction);
     if (plural) {
         m_client->call(service, transaction, transactionInterface, QStringLiteral("SetHints"),
@@ -321,7 +322,7 @@ void PackageKitServiceTest::autoremoveTakesWhatCameAlong()
 
 void PackageKitServiceTest::changesHappenOneAfterTheOther()
 {
-    const QStringList transactions{create(), create()};
+    const QStringList transactions{create(*m_client), create(*m_client)};
     for (const QString &transaction : transactions)
         watch(transaction);
     m_client->watch(service, path, interface, ids({"TransactionListChanged"}));
@@ -348,7 +349,7 @@ void PackageKitServiceTest::changesHappenOneAfterTheOther()
 
 void PackageKitServiceTest::transactionIsUsedOnce()
 {
-    const QString transaction = create();
+    const QString transaction = create(*m_client);
     const QVariantList arguments{noFilter, ids({"acme-mail"})};
     QCOMPARE(textOf(m_client->call(service, transaction, transactionInterface, QStringLiteral("Resolve"),
                                    arguments)),
@@ -362,7 +363,7 @@ void PackageKitServiceTest::transactionIsUsedOnce()
 
 void PackageKitServiceTest::transactionBelongsToItsClient()
 {
-    const QString transaction = create();
+    const QString transaction = create(*m_client);
     const Client other(Client::Own);
     for (const char *member : {"SetHints", "RefreshCache", "Cancel"}) {
         QVariantList arguments;
@@ -382,7 +383,7 @@ void PackageKitServiceTest::cancels()
     const auto cancel = [this](const QString &transaction) {
         return textOf(m_client->call(service, transaction, transactionInterface, QStringLiteral("Cancel")));
     };
-    const QString transaction = create();
+    const QString transaction = create(*m_client);
     watch(transaction);
     const QString notNow = QStringLiteral(
         "org.freedesktop.PackageKit.Transaction.InvalidState: The transaction cannot be cancelled now");
@@ -401,12 +402,7 @@ void PackageKitServiceTest::cancels()
 void PackageKitServiceTest::clientThatLeavesCancels()
 {
     auto leaving = std::make_unique<Client>(Client::Own);
-    const QString transaction
-        = qvariant_cast<QDBusObjectPath>(
-              leaving->call(service, path, interface, QStringLiteral("CreateTransaction"))
-                  .arguments()
-                  .first())
-              .path();
+    const QString transaction = create(*leaving);
     watch(transaction);
     leaving->call(service, transaction, transactionInterface, QStringLiteral("InstallPackages"),
                   {onlyTrusted, ids({"acme-certificates;2026.1-1;noarch;store"})});
@@ -415,9 +411,31 @@ void PackageKitServiceTest::clientThatLeavesCancels()
     QCOMPARE(queried(QStringLiteral("acme-certificates")), QString());
 }
 
+void PackageKitServiceTest::clientThatLeavesTooLateCancelsNothing()
+{
+    auto leaving = std::make_unique<Client>(Client::Own);
+    const QString transaction = create(*leaving);
+    m_client->watch(service, transaction, properties, ids({"PropertiesChanged"}));
+    leaving->call(service, transaction, transactionInterface, QStringLiteral("InstallPackages"),
+                  {onlyTrusted, ids({"acme-certificates;2026.1-1;noarch;store"})});
+    watch(transaction);
+    QStringList told;
+    QVERIFY(waitUntil([&] {
+        told += m_client->takeSignals(service);
+        return told.join(QLatin1Char(' ')).contains(QLatin1String("AllowCancel=<false>"));
+    }));
+    // The database is being written.
+    leaving.reset();
+    told = waitForEnd(told);
+    QCOMPARE(told.filter(QStringLiteral("Finished")), QStringList(success));
+    QVERIFY(!queried(QStringLiteral("acme-certificates")).isEmpty());
+    // The next one's turn comes.
+    QCOMPARE(remove(ids({"acme-certificates;2026.1-1;noarch;installed"})), QStringList(success));
+}
+
 void PackageKitServiceTest::transactionTellsItsProgress()
 {
-    const QString transaction = create();
+    const QString transaction = create(*m_client);
     watch(transaction);
     m_client->watch(service, transaction, properties, ids({"PropertiesChanged"}));
     m_client->call(service, transaction, transactionInterface, QStringLiteral("InstallPackages"),
@@ -442,7 +460,7 @@ void PackageKitServiceTest::transactionTellsItsProgress()
 
 void PackageKitServiceTest::transactionVanishes()
 {
-    const QString transaction = create();
+    const QString transaction = create(*m_client);
     m_client->watch(service, transaction, transactionInterface, ids({"Destroy"}));
     m_client->call(service, transaction, transactionInterface, QStringLiteral("RefreshCache"), {false});
     QVERIFY(m_client->waitForSignals(1));
@@ -452,7 +470,7 @@ void PackageKitServiceTest::transactionVanishes()
 
 void PackageKitServiceTest::stopForgetsTransactions()
 {
-    const QString transaction = create();
+    const QString transaction = create(*m_client);
     m_client->call(service, transaction, transactionInterface, QStringLiteral("InstallPackages"),
                    {onlyTrusted, ids({"acme-broken;1.0-1;noarch;store"})});
     m_client->control(QStringLiteral("StopService"), {service});
