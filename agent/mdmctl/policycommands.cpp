@@ -147,7 +147,7 @@ int runWatch(PolicyEngine &engine, const Policy &policy, const Values &values)
         log.write(QStringLiteral("Watching for drift from %1.").arg(policy.name),
                   {{event, QStringLiteral("watching")}, {QStringLiteral("policy"), policy.name}});
     });
-    return concludeWatch(engine.watch(policy));
+    return concludeWatch(engine.watch(policy, timeoutsOf(values).look));
 }
 
 int runExport(const Values &values)
@@ -218,8 +218,9 @@ Command policyCommand()
     watch.description = QStringLiteral(
         "Applies the policy, then puts right what drifts from it, until it is interrupted (Ctrl-C, exit\n"
         "status 0). A service that leaves and comes back is taken up again.\n"
-        "The phone does not announce when technologies, access points or mobile data change: it is looked at "
-        "them\nevery 30 seconds.\n\n"
+        "What the phone does not announce is looked at every 30 seconds: accounts, autostart, packages\n"
+        "that were installed past the package manager, technologies, access points and mobile data,\n"
+        "assistance data for locations, sideloading and developer mode.\n\n"
         "JSON: one object a line with \"time\" and \"event\": \"setting\" with the members that \"policy "
         "apply\"\n"
         "gives a setting, and \"watching\" with \"policy\" once the policy has been applied.");

@@ -99,10 +99,9 @@ QString CellularSection::Item::path() const
     return steps.join(QLatin1Char('.'));
 }
 
-CellularSection::CellularSection(const Timeouts &timeouts)
-    : m_timeouts(timeouts)
+CellularSection::CellularSection(std::chrono::milliseconds timeout)
+    : m_timeout(timeout)
 {
-    connect(&m_lookAgain, &QTimer::timeout, this, &CellularSection::drifted);
 }
 
 QString CellularSection::member() const
@@ -200,21 +199,18 @@ QVector<Setting> CellularSection::settings(const QJsonObject &wanted) const
 
 Reply CellularSection::open(const QJsonObject &wanted)
 {
-    m_networks = std::make_unique<MobileNetworks>(m_timeouts.confirmation);
+    m_networks = std::make_unique<MobileNetworks>(m_timeout);
     if (wanted.isEmpty())
         return {};
-    m_sims = std::make_unique<SimCards>(m_timeouts.confirmation);
+    m_sims = std::make_unique<SimCards>(m_timeout);
     if (m_sims->ask().isDone())
         m_knownImsis = m_sims->imsis();
     connect(m_sims.get(), &SimCards::changed, this, &CellularSection::followSims);
-    // Nobody announces a change of the others.
-    m_lookAgain.start(m_timeouts.look);
     return {};
 }
 
 void CellularSection::close()
 {
-    m_lookAgain.stop();
     m_networks.reset();
     m_sims.reset();
 }

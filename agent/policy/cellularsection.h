@@ -5,9 +5,7 @@
 #include "accesspoint.h"
 #include "policysection.h"
 #include "simcards.h"
-#include "timeouts.h"
 
-#include <QtCore/QTimer>
 
 #include <memory>
 
@@ -22,7 +20,7 @@ class CellularSection : public PolicySection
     Q_OBJECT
 
 public:
-    explicit CellularSection(const Timeouts &timeouts);
+    explicit CellularSection(std::chrono::milliseconds timeout);
 
     QString member() const override;
     Service service() const override;
@@ -31,6 +29,8 @@ public:
     Reply open(const QJsonObject &wanted) override;
     void close() override;
     QVector<Setting> compare(const QJsonObject &wanted) override;
+    /** Nobody announces but which SIMs there are. */
+    bool mayHaveDrifted() override { return true; }
     Reply change(const Setting &setting) override;
     QJsonObject exported() override;
 
@@ -63,11 +63,10 @@ private:
     QJsonObject exportedSim(const MobileNetworks::Modem &modem) const;
     void followSims();
 
-    const Timeouts m_timeouts;
+    const std::chrono::milliseconds m_timeout;
     std::unique_ptr<MobileNetworks> m_networks;
     std::unique_ptr<SimCards> m_sims; // only while a policy is followed
     QStringList m_knownImsis;
-    QTimer m_lookAgain;
     // As it was when compare() looked.
     QVector<MobileNetworks::Modem> m_modems;
     Answer<Networks> m_accessPoints;

@@ -16,8 +16,6 @@ const QLatin1String sideloadingMember("sideloading");
 const QLatin1String lockoutPath("deviceLock.lockout");
 const QLatin1String sideloadingPath("deviceLock.sideloading");
 
-constexpr std::chrono::milliseconds lookEvery(2000);
-
 Setting::Value allowedOrNot(bool value)
 {
     return {value, value ? QStringLiteral("allowed") : QStringLiteral("forbidden")};
@@ -28,7 +26,6 @@ Setting::Value allowedOrNot(bool value)
 DeviceLockSection::DeviceLockSection(std::chrono::milliseconds timeout)
     : m_timeout(timeout)
 {
-    connect(&m_look, &QTimer::timeout, this, &DeviceLockSection::lookAtSideloading);
 }
 
 QString DeviceLockSection::member() const
@@ -64,33 +61,24 @@ QVector<Setting> DeviceLockSection::settings(const QJsonObject &wanted) const
     return settings;
 }
 
-Reply DeviceLockSection::open(const QJsonObject &wanted)
+Reply DeviceLockSection::open(const QJsonObject &)
 {
     m_locker = std::make_unique<DeviceLocker>(m_timeout);
     m_switches = std::make_unique<SecuritySwitches>(m_timeout);
     const Reply opened = m_locker->open();
     connect(&m_locker->lock(), &DeviceLock::stateChanged, this, &DeviceLockSection::drifted);
-    if (wanted.contains(sideloadingMember)) {
-        m_sideloadingSeen = m_switches->sideloading().value;
-        m_look.start(lookEvery);
-    }
     return opened;
 }
 
 void DeviceLockSection::close()
 {
-    m_look.stop();
     m_locker.reset();
     m_switches.reset();
 }
 
-void DeviceLockSection::lookAtSideloading()
+bool DeviceLockSection::mayHaveDrifted()
 {
-    const bool isAllowed = m_switches->sideloading().value;
-    if (isAllowed == m_sideloadingSeen)
-        return;
-    m_sideloadingSeen = isAllowed;
-    Q_EMIT drifted();
+    return m_sideloadingSeen && *m_sideloadingSeen != m_switches->sideloading().value;
 }
 
 QVector<Setting> DeviceLockSection::compare(const QJsonObject &wanted)
@@ -110,9 +98,10 @@ Setting DeviceLockSection::compareLockout(Setting setting) const
     return setting.compared();
 }
 
-Setting DeviceLockSection::compareSideloading(Setting setting) const
+Setting DeviceLockSection::compareSideloading(Setting setting)
 {
     const Answer<bool> sideloading = m_switches->sideloading();
+    m_sideloadingSeen = sideloading.value;
     // A phone that does not say can be told all the same.
     if (!sideloading.reply.isDone())
         return setting.with(Setting::Different, sideloading.reply.text);
@@ -123,7 +112,12 @@ Setting DeviceLockSection::compareSideloading(Setting setting) const
 Reply DeviceLockSection::change(const Setting &setting)
 {
     const bool wanted = setting.wanted.json.toBool();
-    return setting.path == lockoutPath ? m_locker->setLockout(wanted) : m_switches->setSideloading(wanted);
+    if (setting.path == lockoutPath)
+        return m_locker->setLockout(wanted);
+    const Reply reply = m_switches->setSideloading(wanted);
+    if (reply.isDone())
+        m_sideloadingSeen = wanted;
+    return reply;
 }
 
 QJsonObject DeviceLockSection::exported()

@@ -6,10 +6,9 @@
 #include "policysection.h"
 #include "securityswitches.h"
 
-#include <QtCore/QTimer>
-
 #include <chrono>
 #include <memory>
+#include <optional>
 
 namespace Corvane
 {
@@ -31,19 +30,19 @@ public:
     Reply open(const QJsonObject &wanted) override;
     void close() override;
     QVector<Setting> compare(const QJsonObject &wanted) override;
+    /** Nobody tells of a change of sideloading. */
+    bool mayHaveDrifted() override;
     Reply change(const Setting &setting) override;
     QJsonObject exported() override;
 
 private:
     Setting compareLockout(Setting setting) const;
-    Setting compareSideloading(Setting setting) const;
-    void lookAtSideloading();
+    Setting compareSideloading(Setting setting);
 
     const std::chrono::milliseconds m_timeout;
     std::unique_ptr<DeviceLocker> m_locker;
     std::unique_ptr<SecuritySwitches> m_switches;
-    QTimer m_look; // nobody tells of a change of sideloading
-    bool m_sideloadingSeen = false;
+    std::optional<bool> m_sideloadingSeen; ///< or made so, when the policy names it
 };
 
 } // namespace Agent

@@ -7,13 +7,12 @@ namespace Agent
 {
 
 DeviceSettingsSection::DeviceSettingsSection(const QString &member, const DeviceSettingsMaker &make,
-                                             const Timeouts &timeouts)
+                                             std::chrono::milliseconds timeout)
     : m_member(member)
     , m_make(make)
-    , m_timeouts(timeouts)
-    , m_settings(make(timeouts.confirmation))
+    , m_timeout(timeout)
+    , m_settings(make(timeout))
 {
-    connect(&m_lookAgain, &QTimer::timeout, this, &DeviceSettingsSection::drifted);
 }
 
 QString DeviceSettingsSection::fault(const QJsonObject &) const
@@ -36,23 +35,15 @@ QVector<Setting> DeviceSettingsSection::settings(const QJsonObject &wanted) cons
     return settings;
 }
 
-Reply DeviceSettingsSection::open(const QJsonObject &wanted)
+Reply DeviceSettingsSection::open(const QJsonObject &)
 {
     // Made anew for a service that has come back.
-    m_settings = m_make(m_timeouts.confirmation);
+    m_settings = m_make(m_timeout);
     const Reply opened = m_settings->open();
     if (!opened.isDone())
         return opened;
     connect(m_settings.get(), &DeviceSettings::changed, this, &DeviceSettingsSection::drifted);
-    // Not every one announces its changes.
-    if (!wanted.isEmpty())
-        m_lookAgain.start(m_timeouts.look);
     return {};
-}
-
-void DeviceSettingsSection::close()
-{
-    m_lookAgain.stop();
 }
 
 const DeviceSetting *DeviceSettingsSection::settingAt(const QString &path) const

@@ -4,10 +4,8 @@
 
 #include "devicesettings.h"
 #include "policysection.h"
-#include "timeouts.h"
 
-#include <QtCore/QTimer>
-
+#include <chrono>
 #include <memory>
 
 namespace Corvane
@@ -21,15 +19,18 @@ class DeviceSettingsSection : public PolicySection
     Q_OBJECT
 
 public:
-    DeviceSettingsSection(const QString &member, const DeviceSettingsMaker &make, const Timeouts &timeouts);
+    DeviceSettingsSection(const QString &member, const DeviceSettingsMaker &make,
+                          std::chrono::milliseconds timeout);
 
     QString member() const override { return m_member; }
     Service service() const override { return m_settings->service(); }
     QString fault(const QJsonObject &wanted) const override;
     QVector<Setting> settings(const QJsonObject &wanted) const override;
     Reply open(const QJsonObject &wanted) override;
-    void close() override;
+    void close() override { }
     QVector<Setting> compare(const QJsonObject &wanted) override;
+    /** Not every setting announces its changes. */
+    bool mayHaveDrifted() override { return true; }
     Reply change(const Setting &setting) override;
     QJsonObject exported() override;
 
@@ -38,9 +39,8 @@ private:
 
     const QString m_member;
     const DeviceSettingsMaker m_make;
-    const Timeouts m_timeouts;
+    const std::chrono::milliseconds m_timeout;
     std::unique_ptr<DeviceSettings> m_settings;
-    QTimer m_lookAgain;
 };
 
 } // namespace Agent

@@ -112,7 +112,7 @@ Reply PackageSection::open(const QJsonObject &)
     m_known = installed();
     // PackageKit is idle after each thing that it did, those that changed nothing included.
     connect(m_manager.get(), &PackageManager::idle, this, [this] {
-        if (installed() != m_known)
+        if (mayHaveDrifted())
             Q_EMIT drifted();
     });
     return {};

@@ -30,6 +30,8 @@ public:
     Reply open(const QJsonObject &wanted) override;
     void close() override;
     QVector<Setting> compare(const QJsonObject &wanted) override;
+    /** A package may be installed past PackageKit. */
+    bool mayHaveDrifted() override { return installed() != m_known; }
     Reply change(const Setting &setting) override;
     QJsonObject exported() override;
 

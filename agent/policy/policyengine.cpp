@@ -5,9 +5,11 @@
 #include "systembus.h"
 
 #include <QtCore/QSysInfo>
+#include <QtCore/QTimer>
 #include <QtDBus/QDBusConnection>
 
 #include <algorithm>
+#include <utility>
 
 namespace Corvane
 {
@@ -118,7 +120,7 @@ Setting PolicyEngine::changed(PolicySection *section, const Setting &setting)
     return setting.unanswered(reply, Setting::Failed);
 }
 
-Reply PolicyEngine::watch(const Policy &policy)
+Reply PolicyEngine::watch(const Policy &policy, std::chrono::milliseconds look)
 {
     Reply end = SystemBus::reach();
     const SystemBus bus;
@@ -132,6 +134,14 @@ Reply PolicyEngine::watch(const Policy &policy)
         if (!policy.settingsOf(*entry.section).isEmpty())
             follow(entry);
     }
+    // Not while something else is under way.
+    bool isLookDue = false;
+    QTimer timer;
+    connect(&timer, &QTimer::timeout, this, [&] {
+        isLookDue = true;
+        m_loop.quit();
+    });
+    timer.start(look);
     const auto isOver = [&] {
         return isInterrupted() || !end.isDone();
     };
@@ -139,13 +149,15 @@ Reply PolicyEngine::watch(const Policy &policy)
         return entry.due;
     };
     for (bool applied = false; !isOver(); applied = true) {
+        if (std::exchange(isLookDue, false))
+            lookAgain();
         for (Entry &entry : m_entries) {
             if (entry.due)
                 takeUp(entry, policy);
         }
         if (!applied)
             Q_EMIT watching();
-        if (!isOver() && std::none_of(m_entries.cbegin(), m_entries.cend(), isDue))
+        if (!isOver() && !isLookDue && std::none_of(m_entries.cbegin(), m_entries.cend(), isDue))
             m_loop.exec();
     }
     return end.isDone() ? interrupted() : end;
@@ -169,6 +181,14 @@ void PolicyEngine::follow(Entry &entry)
     }
     connect(entry.section, &PolicySection::drifted, this, wake);
     entry.due = true;
+}
+
+void PolicyEngine::lookAgain()
+{
+    for (Entry &entry : m_entries) {
+        if (entry.open && !entry.due)
+            entry.due = entry.section->mayHaveDrifted();
+    }
 }
 
 void PolicyEngine::takeUp(Entry &entry, const Policy &policy)

@@ -10,6 +10,7 @@
 #include <QtCore/QObject>
 #include <QtDBus/QDBusServiceWatcher>
 
+#include <chrono>
 #include <vector>
 
 namespace Corvane
@@ -35,9 +36,10 @@ public:
 
     /**
      * Applies @p policy and puts right what drifts from it, until an Interruption is requested or the system
-     * bus is gone. A service that leaves and comes back is taken up again.
+     * bus is gone. A service that leaves and comes back is taken up again. What the phone does not announce
+     * is looked at every @p look.
      */
-    Reply watch(const Policy &policy);
+    Reply watch(const Policy &policy, std::chrono::milliseconds look);
 
     /** The phone's present state, and the sections that could not be asked. */
     struct Export {
@@ -74,6 +76,7 @@ private:
     Reply open(Entry &entry, const QJsonObject &wanted);
     Setting changed(PolicySection *section, const Setting &setting);
     void follow(Entry &entry);
+    void lookAgain();
     void takeUp(Entry &entry, const Policy &policy);
     void report(const Setting &setting);
 

@@ -54,6 +54,12 @@ public:
     /** Fills in how the phone stands to each of settings(). */
     virtual QVector<Setting> compare(const QJsonObject &wanted) = 0;
 
+    /**
+     * Whether the phone may differ from what compare() last told without having announced it. Asked again and
+     * again while a policy is watched, so that a section which says so without need makes work.
+     */
+    virtual bool mayHaveDrifted() { return false; }
+
     /** Makes one different setting of compare() so, and waits until the service confirms it. */
     virtual Reply change(const Setting &setting) = 0;
 
@@ -61,7 +67,7 @@ public:
     virtual QJsonObject exported() = 0;
 
 Q_SIGNALS:
-    /** The phone may differ from what compare() last told. */
+    /** The phone has announced something by which it may differ from what compare() last told. */
     void drifted();
 
     /** change() has come so far with the setting at @p path. */

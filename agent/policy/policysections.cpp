@@ -27,15 +27,15 @@ PolicySections makePolicySections(const Timeouts &timeouts)
     sections.push_back(std::make_unique<PackageSection>(timeouts.silence));
     for (const Radio radio : {Radio::FlightMode, Radio::WiFi})
         sections.push_back(std::make_unique<RadioSection>(radio, timeouts.confirmation));
-    sections.push_back(std::make_unique<CellularSection>(timeouts));
+    sections.push_back(std::make_unique<CellularSection>(timeouts.confirmation));
     sections.push_back(std::make_unique<ProxySection>(timeouts.confirmation));
     sections.push_back(std::make_unique<AccountSection>());
     sections.push_back(std::make_unique<CertificateSection>(timeouts.confirmation));
     sections.push_back(std::make_unique<AutostartSection>());
-    sections.push_back(
-        std::make_unique<DeviceSettingsSection>(QStringLiteral("location"), makeLocationSettings, timeouts));
-    sections.push_back(
-        std::make_unique<DeviceSettingsSection>(QStringLiteral("time"), makeClockSettings, timeouts));
+    sections.push_back(std::make_unique<DeviceSettingsSection>(
+        QStringLiteral("location"), makeLocationSettings, timeouts.confirmation));
+    sections.push_back(std::make_unique<DeviceSettingsSection>(QStringLiteral("time"), makeClockSettings,
+                                                               timeouts.confirmation));
     sections.push_back(std::make_unique<DeviceLockSection>(timeouts.confirmation));
     sections.push_back(std::make_unique<SecuritySection>(timeouts.silence));
     sections.push_back(std::make_unique<SoftwareUpdateSection>(timeouts.silence));

@@ -73,6 +73,9 @@ QVector<Setting> PresenceSection::compare(const QJsonObject &wanted)
             m_entries.insert(pathOf(entry), entry);
     }
     const Reply looked = look();
+    m_presentPaths.reset();
+    if (looked.isDone())
+        m_presentPaths = presentPaths();
     QVector<Setting> settings = this->settings(wanted);
     for (Setting &setting : settings) {
         setting = looked.isDone() ? compared(setting, m_entries.value(setting.path))
@@ -94,10 +97,33 @@ Setting PresenceSection::compared(Setting setting, const QJsonValue &entry) cons
                          : setting.with(Setting::Unsupported, why);
 }
 
+QSet<QString> PresenceSection::presentPaths() const
+{
+    QSet<QString> paths;
+    for (auto entry = m_entries.cbegin(); entry != m_entries.cend(); ++entry) {
+        if (has(entry.value()))
+            paths.insert(entry.key());
+    }
+    return paths;
+}
+
+bool PresenceSection::mayHaveDrifted()
+{
+    return look().isDone() && m_presentPaths != presentPaths();
+}
+
 Reply PresenceSection::change(const Setting &setting)
 {
     const QJsonValue entry = m_entries.value(setting.path);
-    return setting.wanted.json.toBool() ? add(entry) : remove(entry);
+    const bool isWanted = setting.wanted.json.toBool();
+    const Reply reply = isWanted ? add(entry) : remove(entry);
+    if (reply.isDone() && m_presentPaths) {
+        if (isWanted)
+            m_presentPaths->insert(setting.path);
+        else
+            m_presentPaths->remove(setting.path);
+    }
+    return reply;
 }
 
 } // namespace Agent

@@ -5,6 +5,9 @@
 #include "policysection.h"
 
 #include <QtCore/QMap>
+#include <QtCore/QSet>
+
+#include <optional>
 
 namespace Corvane
 {
@@ -20,6 +23,7 @@ public:
     QString fault(const QJsonObject &wanted) const override;
     QVector<Setting> settings(const QJsonObject &wanted) const override;
     QVector<Setting> compare(const QJsonObject &wanted) override;
+    bool mayHaveDrifted() override;
     Reply change(const Setting &setting) override;
 
 protected:
@@ -37,8 +41,11 @@ protected:
 private:
     Setting compared(Setting setting, const QJsonValue &entry) const;
     QString pathOf(const QJsonValue &entry) const;
+    /** The paths of those entries that the phone had at the last look. */
+    QSet<QString> presentPaths() const;
 
     QMap<QString, QJsonValue> m_entries; ///< by path, of the last comparison
+    std::optional<QSet<QString>> m_presentPaths; ///< by the last comparison and what changed since, when known
 };
 
 } // namespace Agent

@@ -11,14 +11,11 @@ namespace
 
 const QLatin1String developerModeMember("developerMode");
 
-constexpr std::chrono::milliseconds lookEvery(2000);
-
 } // namespace
 
 SecuritySection::SecuritySection(std::chrono::milliseconds timeout)
     : m_timeout(timeout)
 {
-    connect(&m_look, &QTimer::timeout, this, &SecuritySection::lookAtDeveloperMode);
 }
 
 QString SecuritySection::member() const
@@ -50,31 +47,25 @@ QVector<Setting> SecuritySection::settings(const QJsonObject &wanted) const
 Reply SecuritySection::open(const QJsonObject &)
 {
     m_switches = std::make_unique<SecuritySwitches>(m_timeout);
-    m_developerModeSeen = m_switches->developerMode();
-    m_look.start(lookEvery);
     return {};
 }
 
 void SecuritySection::close()
 {
-    m_look.stop();
     m_switches.reset();
 }
 
-void SecuritySection::lookAtDeveloperMode()
+bool SecuritySection::mayHaveDrifted()
 {
-    const bool isOn = m_switches->developerMode();
-    if (isOn == m_developerModeSeen)
-        return;
-    m_developerModeSeen = isOn;
-    Q_EMIT drifted();
+    return m_switches->developerMode() != m_developerModeSeen;
 }
 
 QVector<Setting> SecuritySection::compare(const QJsonObject &wanted)
 {
+    m_developerModeSeen = m_switches->developerMode();
     QVector<Setting> settings = this->settings(wanted);
     for (Setting &setting : settings) {
-        setting.present = Setting::Value::onOff(m_switches->developerMode());
+        setting.present = Setting::Value::onOff(m_developerModeSeen);
         setting = setting.compared();
     }
     return settings;
@@ -82,7 +73,9 @@ QVector<Setting> SecuritySection::compare(const QJsonObject &wanted)
 
 Reply SecuritySection::change(const Setting &setting)
 {
-    return m_switches->setDeveloperMode(setting.wanted.json.toBool());
+    const Reply reply = m_switches->setDeveloperMode(setting.wanted.json.toBool());
+    m_developerModeSeen = m_switches->developerMode();
+    return reply;
 }
 
 QJsonObject SecuritySection::exported()

@@ -5,8 +5,6 @@
 #include "policysection.h"
 #include "securityswitches.h"
 
-#include <QtCore/QTimer>
-
 #include <chrono>
 #include <memory>
 
@@ -30,16 +28,15 @@ public:
     Reply open(const QJsonObject &wanted) override;
     void close() override;
     QVector<Setting> compare(const QJsonObject &wanted) override;
+    /** Nobody tells of a package that somebody else installs. */
+    bool mayHaveDrifted() override;
     Reply change(const Setting &setting) override;
     QJsonObject exported() override;
 
 private:
-    void lookAtDeveloperMode();
-
     const std::chrono::milliseconds m_timeout;
     std::unique_ptr<SecuritySwitches> m_switches;
-    QTimer m_look; // nobody tells of a package that somebody else installs
-    bool m_developerModeSeen = false;
+    bool m_developerModeSeen = false; ///< or made so
 };
 
 } // namespace Agent

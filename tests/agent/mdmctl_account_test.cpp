@@ -50,6 +50,7 @@ private Q_SLOTS:
     void policyMakesAndDeletesAccounts();
     void policyWithoutAPassword();
     void policyWithAPasswordThatIsNotThere();
+    void policyDriftIsPutRight();
     void policyMistakes_data();
     void policyMistakes();
 
@@ -384,6 +385,23 @@ void MdmctlAccountTest::policyWithAPasswordThatIsNotThere()
     QVERIFY(applied.output.contains(QLatin1String("failed")));
     QCOMPARE(applied.status, 1);
     QCOMPARE(accounts().size(), 1);
+}
+
+void MdmctlAccountTest::policyDriftIsPutRight()
+{
+    const QString policy = file("policy.json", R"({"accounts": {
+        "forbidden": [{"provider": "corvane-cloud", "user": "lena"}]}})");
+    Mdmctl watch({QStringLiteral("policy"), QStringLiteral("watch"), policy, QStringLiteral("--look"),
+                  QStringLiteral("0.2")});
+    QVERIFY(watch.waitForOutput(QStringLiteral("Watching for drift")));
+    // Nobody announces this.
+    QCOMPARE(
+        run(QStringLiteral("create corvane-cloud corvane-cloud-sync lena --password-file ") + m_password).status,
+        0);
+    QVERIFY(watch.waitForOutput(QStringLiteral("accounts.corvane-cloud.lena: changed (remove it)")));
+    watch.interrupt(SIGINT);
+    QCOMPARE(watch.finish().status, 0);
+    QCOMPARE(accounts(), QStringList(QStringLiteral("corvane-cloud Maria's cloud")));
 }
 
 void MdmctlAccountTest::policyMistakes_data()

@@ -8,6 +8,8 @@
 #include <QtCore/QTemporaryDir>
 #include <QtTest/QtTest>
 
+#include <csignal>
+
 namespace
 {
 
@@ -39,10 +41,12 @@ private Q_SLOTS:
     void refusalsAreTold();
     void absenceIsTold();
     void policy();
+    void policyDriftIsPutRight();
     void policyNamesEachOnce();
 
 private:
     Mdmctl::Result policy(const char *command, const QByteArray &json);
+    QString write(const QByteArray &json) const;
 
     QTemporaryDir m_folder;
     Phone m_phone;
@@ -72,10 +76,15 @@ void MdmctlAutostartTest::cleanup()
 
 Mdmctl::Result MdmctlAutostartTest::policy(const char *command, const QByteArray &json)
 {
+    return Mdmctl::run({QStringLiteral("policy"), QLatin1String(command), write(json)});
+}
+
+QString MdmctlAutostartTest::write(const QByteArray &json) const
+{
     QFile file(m_folder.filePath(QStringLiteral("policy.json")));
-    if (!file.open(QIODevice::WriteOnly) || file.write(json) != json.size() || !file.flush())
+    if (!file.open(QIODevice::WriteOnly) || file.write(json) != json.size())
         qFatal("cannot write the policy");
-    return Mdmctl::run({QStringLiteral("policy"), QLatin1String(command), file.fileName()});
+    return file.fileName();
 }
 
 void MdmctlAutostartTest::addsListsAndRemoves()
@@ -153,6 +162,26 @@ void MdmctlAutostartTest::policy()
     QVERIFY2(failed.output.contains(QLatin1String("it does not accept the desktop entry \"none.desktop\"")),
              qPrintable(failed.output));
     QCOMPARE(failed.status, 1);
+}
+
+void MdmctlAutostartTest::policyDriftIsPutRight()
+{
+    const QString policy = write(
+        R"({"autostart": {"required": ["test-a.desktop", "none.desktop"], "forbidden": ["test-b.desktop"]}})");
+    Mdmctl watch({QStringLiteral("policy"), QStringLiteral("watch"), policy, QStringLiteral("--look"),
+                  QStringLiteral("0.2")});
+    QVERIFY(watch.waitForOutput(QStringLiteral("Watching for drift")));
+    // Nobody announces these.
+    QCOMPARE(run("remove test-a.desktop").status, 0);
+    QVERIFY(watch.waitForOutput(QStringLiteral("autostart.test-a.desktop: changed (add it)"), 2));
+    QCOMPARE(run("add test-b.desktop").status, 0);
+    QVERIFY(watch.waitForOutput(QStringLiteral("autostart.test-b.desktop: changed (remove it)")));
+    watch.interrupt(SIGINT);
+    const Mdmctl::Result watched = watch.finish();
+    QCOMPARE(watched.status, 0);
+    // A change that was refused is not asked for again while nothing else happens.
+    const int attempts = m_phone.takeJournal(Service).filter(QStringLiteral("none.desktop")).size();
+    QVERIFY2(attempts <= 3, qPrintable(QString::number(attempts)));
 }
 
 void MdmctlAutostartTest::policyNamesEachOnce()

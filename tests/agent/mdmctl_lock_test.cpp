@@ -433,8 +433,8 @@ void MdmctlLockTest::policyWatchPutsRight()
     QVERIFY(file.open(QIODevice::WriteOnly));
     file.write(R"({"deviceLock": {"lockout": true, "sideloading": false}})");
     file.close();
-    Mdmctl watch(
-        {QStringLiteral("policy"), QStringLiteral("watch"), file.fileName(), QStringLiteral("--json")});
+    Mdmctl watch({QStringLiteral("policy"), QStringLiteral("watch"), file.fileName(),
+                  QStringLiteral("--json"), QStringLiteral("--look"), QStringLiteral("0.2")});
     QVERIFY(watch.waitForOutput(QStringLiteral("\"watching\"")));
     QCOMPARE(lockState().value(QStringLiteral("state")).toString(), QStringLiteral("manager-lockout"));
     const auto changes = [this](const char *method) {

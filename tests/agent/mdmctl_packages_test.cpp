@@ -71,6 +71,7 @@ private Q_SLOTS:
     void exportIsWhatCheckAccepts();
     void watchPutsDriftRight();
     void watchDoesNotRepeatARefusedChange();
+    void watchSeesWhatPackageKitDidNotDo();
 
 private:
     Mdmctl::Result policy(const char *command, const QByteArray &packages) const;
@@ -474,6 +475,28 @@ void MdmctlPackagesTest::watchDoesNotRepeatARefusedChange()
     watch.interrupt(SIGINT);
     QCOMPARE(watch.finish().status, 0);
     QCOMPARE(run("remove acme-certificates").status, 0);
+}
+
+void MdmctlPackagesTest::watchSeesWhatPackageKitDidNotDo()
+{
+    Mdmctl watch({QStringLiteral("policy"), QStringLiteral("watch"), QStringLiteral("--look"),
+                  QStringLiteral("0.2"), write(R"({"forbidden": ["desk-clock"]})")});
+    QVERIFY(watch.waitForOutput(QStringLiteral("packages.forbidden.desk-clock: compliant")));
+    QProcess database;
+    database.start(QStringLiteral("corvane-package-database"), {QStringLiteral("add")});
+    database.write(R"([{"name": "desk-clock", "version": "3.0"}])");
+    database.closeWriteChannel();
+    QVERIFY(database.waitForFinished());
+    QCOMPARE(database.exitCode(), 0);
+    // PackageKit of the simulated phone knows its own packages alone.
+    QVERIFY(watch.waitForOutput(
+        QStringLiteral("packages.forbidden.desk-clock: failed (Package not found: desk-clock)")));
+    QCOMPARE(QProcess::execute(QStringLiteral("corvane-package-database"),
+                               {QStringLiteral("remove"), QStringLiteral("desk-clock")}),
+             0);
+    QVERIFY(watch.waitForOutput(QStringLiteral("packages.forbidden.desk-clock: compliant"), 2));
+    watch.interrupt(SIGINT);
+    QCOMPARE(watch.finish().status, 0);
 }
 
 QTEST_GUILESS_MAIN(MdmctlPackagesTest)

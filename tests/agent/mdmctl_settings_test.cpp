@@ -43,7 +43,7 @@ QByteArray contentOf(const QString &fileName)
 
 } // namespace
 
-/** Location and time: commands and policies. */
+/** Location, time and developer mode: commands and policies. */
 class MdmctlSettingsTest : public QObject
 {
     Q_OBJECT
@@ -78,6 +78,8 @@ private Q_SLOTS:
     void policyRefusesUnknownWords();
     void policyIsExported();
     void policyDriftIsPutRight();
+    void developerModeOnAndOff();
+    void policyOfDeveloperMode();
 
 private:
     Mdmctl::Result policy(const char *command, const QByteArray &text)
@@ -468,6 +470,40 @@ void MdmctlSettingsTest::policyDriftIsPutRight()
     QVERIFY(watch.waitForOutput(QStringLiteral("location.mls: changed (from on to off)")));
     run("time set automaticTime off");
     QVERIFY(watch.waitForOutput(QStringLiteral("time.automaticTime: changed (from off to on)")));
+    watch.interrupt(SIGINT);
+    QCOMPARE(watch.finish().status, 0);
+}
+
+void MdmctlSettingsTest::developerModeOnAndOff()
+{
+    const auto isOn = [] {
+        return run("security status --json").json().value(QLatin1String("developerMode"));
+    };
+    const Mdmctl::Result on = run("security developer-mode on");
+    QCOMPARE(on.errors, QString());
+    QCOMPARE(on.status, 0);
+    QCOMPARE(isOn(), QJsonValue(true));
+    QCOMPARE(run("security developer-mode off --json").json(), json(R"({"developerMode": false})"));
+    QCOMPARE(isOn(), QJsonValue(false));
+}
+
+void MdmctlSettingsTest::policyOfDeveloperMode()
+{
+    QCOMPARE(policy("check", R"({"security": {"developerMode": true}})").status, 1);
+    QCOMPARE(policy("apply", R"({"security": {"developerMode": true}})").status, 0);
+    QCOMPARE(policy("check", R"({"security": {"developerMode": true}})").status, 0);
+
+    QFile file(m_folder.filePath(QStringLiteral("policy.json")));
+    QVERIFY(file.open(QIODevice::WriteOnly | QIODevice::Truncate));
+    file.write(R"({"security": {"developerMode": false}})");
+    file.close();
+    Mdmctl watch({QStringLiteral("policy"), QStringLiteral("watch"), file.fileName(),
+                  QStringLiteral("--look"), QStringLiteral("0.2")});
+    const QString changed = QStringLiteral("security.developerMode: changed (from on to off)");
+    QVERIFY(watch.waitForOutput(changed));
+    // It may be off again before this one sees that it was on.
+    Mdmctl on(words("security developer-mode on"));
+    QVERIFY(watch.waitForOutput(changed, 2));
     watch.interrupt(SIGINT);
     QCOMPARE(watch.finish().status, 0);
 }
