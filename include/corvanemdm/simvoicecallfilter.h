@@ -22,8 +22,13 @@ class SimVoiceCallFilterPrivate;
  * change nothing. The mirrored state changes only when the service announces the change. A request that the
  * service refuses is logged ("Method call failed:", the error's name and message) and changes nothing.
  *
+ * Requests are compared with the mirrored state, which is empty and Block until readyChanged(): before that,
+ * false may also mean that the request would change something. The state is asked for once: the changes of a
+ * service that was away in between are not seen.
+ *
  * An object whose service was not running at construction stays inert, also when the service appears later:
- * never ready, empty lists, Block as the defaults, and every mutator returns false.
+ * never ready, empty lists, Block as the defaults, and every mutator returns false. It also stays unready,
+ * with a warning, when the service refuses to tell the rules of either direction.
  *
  * Source: telephony service "org.ofono", objects "/mdm/voicecallfilter/dial" and
  * "/mdm/voicecallfilter/incoming".
@@ -52,7 +57,7 @@ public:
     explicit SimVoiceCallFilter(QObject *parent = nullptr);
     ~SimVoiceCallFilter() override;
 
-    /** False until readyChanged(), and for good where the service is absent. */
+    /** False until readyChanged(), and for good where the service is absent or does not tell its rules. */
     bool ready() const;
 
     /** SimFilter::Block until the object is ready. */

@@ -27,8 +27,9 @@ class SoftwareUpdatePrivate;
  *
  * softwareUpdateFailed() ends any of them instead. The proxy, not this class, enforces the order. Nothing is
  * kept here: each query asks the proxy. Signals reach every object of the class, whichever client started the
- * operation. The object is registered with the proxy as a client for as long as it lives; construction and
- * destruction therefore block as well.
+ * operation. The object registers with the proxy as a client when it is made and leaves when it is deleted,
+ * which block as well. It registers once: a proxy that was away then, or has restarted since, does not know
+ * it and may send it nothing; another object has to be made.
  *
  * Source: MDM proxy "org.corvaneos.mdmproxy", object "/Corvane/Mdm/Proxy/SoftwareUpdate".
  */

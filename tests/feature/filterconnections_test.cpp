@@ -10,6 +10,7 @@
 #include <corvanemdm/simvoicecallfilter.h>
 
 #include <QtDBus/QDBusConnection>
+#include <QtDBus/QDBusMessage>
 #include <QtDBus/QDBusMetaType>
 #include <QtTest/QtTest>
 
@@ -28,6 +29,9 @@ const QString Service = QStringLiteral("org.ofono");
 
 /** Signals that QtDBus is not to connect, as "path member"; of each of them when it is the path alone. */
 QStringList refused; // clazy:exclude=non-pod-global-static
+
+/** What was asked of QtDBus, in this order: "connect <path>" and "call <path> <member>". */
+QStringList requests; // clazy:exclude=non-pod-global-static
 
 /** The service's object for one kind of traffic, its signals in the order in which the filter connects them,
  * and what it calls them in its warnings. */
@@ -87,6 +91,7 @@ Q_DECL_EXPORT bool QDBusConnection::connect(const QString &service, const QStrin
                                             const QStringList &argumentMatch, const QString &signature,
                                             QObject *receiver, const char *slot)
 {
+    requests << QLatin1String("connect ") + path;
     if (refused.contains(path) || refused.contains(path + QLatin1Char(' ') + name))
         return false;
     using Connect = bool (*)(QDBusConnection *, const QString &, const QString &, const QString &,
@@ -94,6 +99,19 @@ Q_DECL_EXPORT bool QDBusConnection::connect(const QString &service, const QStrin
     static const auto next = reinterpret_cast<Connect>(
         dlsym(RTLD_NEXT, "_ZN15QDBusConnection7connectERK7QStringS2_S2_S2_RK11QStringListS2_P7QObjectPKc"));
     return next(this, service, path, interface, name, argumentMatch, signature, receiver, slot);
+}
+
+// How the library asks for a state. It goes on to QtDBus's own.
+Q_DECL_EXPORT bool QDBusConnection::callWithCallback(const QDBusMessage &message, QObject *receiver,
+                                                     const char *returnMethod, const char *errorMethod,
+                                                     int timeout) const
+{
+    requests << QStringLiteral("call %1 %2").arg(message.path(), message.member());
+    using Call
+        = bool (*)(const QDBusConnection *, const QDBusMessage &, QObject *, const char *, const char *, int);
+    static const auto next = reinterpret_cast<Call>(
+        dlsym(RTLD_NEXT, "_ZNK15QDBusConnection16callWithCallbackERK12QDBusMessageP7QObjectPKcS6_i"));
+    return next(this, message, receiver, returnMethod, errorMethod, timeout);
 }
 
 /** Filters that the bus does not let hear all that they want to. */
@@ -108,6 +126,8 @@ private Q_SLOTS:
     void oneSignal();
     void allSignals_data();
     void allSignals();
+    void listensBeforeItAsks_data() { allSignals_data(); }
+    void listensBeforeItAsks();
 };
 
 void FilterConnectionsTest::initTestCase()
@@ -187,6 +207,21 @@ void FilterConnectionsTest::allSignals()
     QCOMPARE(log.takeWarnings(), warnings);
     QVERIFY(waitUntil([&filter] { return filter->property("ready").toBool(); }));
     QCOMPARE(log.takeWarnings(), QStringList());
+}
+
+void FilterConnectionsTest::listensBeforeItAsks()
+{
+    QFETCH(int, kind);
+    const Phone phone;
+    requests.clear();
+    const std::unique_ptr<QObject> filter = Kinds[kind].make();
+    for (const Channel &channel : Kinds[kind].channels) {
+        const QString call = QStringLiteral("call %1 GetAll").arg(channel.path);
+        const QString connection = QLatin1String("connect ") + channel.path;
+        QCOMPARE(requests.count(call), 1);
+        QCOMPARE(requests.count(connection), channel.members.size());
+        QVERIFY(requests.lastIndexOf(connection) < requests.indexOf(call));
+    }
 }
 
 QTEST_GUILESS_MAIN(FilterConnectionsTest)

@@ -267,7 +267,10 @@ void RuleChannelTest::isNeverReadyWhenTheAnswerFails()
     QCOMPARE(seen.take(),
              channel.sequence({"default", "changed [], [1:allow]", "added 1:allow", "added 1:allow"}));
     QVERIFY(!filter->ready());
-    QCOMPARE(takeCalls(channel), channel.calls({"GetAll ()"}));
+    // Requests are sent all the same.
+    QVERIFY(filter->setRule(rule("3", SimFilter::Block)));
+    m_phone->settle(Service);
+    QCOMPARE(takeCalls(channel), channel.calls({"GetAll ()", "Add@Rule ('3', uint32 1)"}));
 }
 
 void RuleChannelTest::answerOfAnotherTypeIsAFailure()
@@ -394,6 +397,20 @@ void RuleChannelTest::ruleChanged()
                  : channel.sequence({"changed [1:block 2:block 3:block], [1:block 2:hangup 3:block]"}));
 }
 
+void RuleChannelTest::ruleChangedOfAnImsiThatIsThereTwice()
+{
+    QFETCH(TestedChannel, channel);
+    const auto filter = readyFilter(channel);
+    emitFrom(channel, "@RulesChanged", {wire({wireRule("1", 1), wireRule("1", 2)})});
+    SignalSequence seen(filter->object());
+    // The first one counts, and has that action already.
+    emitFrom(channel, "@RuleChanged", {1U, wire("1", 1)});
+    QCOMPARE(seen.take(), QStringList());
+    // A rule that equals another one is not among those that the change added.
+    emitFrom(channel, "@RuleChanged", {1U, wire("1", 2)});
+    QCOMPARE(seen.take(), channel.sequence({"changed [1:block 1:allow], [1:allow 1:allow]"}));
+}
+
 void RuleChannelTest::ruleRemoved()
 {
     QFETCH(TestedChannel, channel);
@@ -506,6 +523,27 @@ void RuleChannelTest::signalsOfAnotherShapeAreNotTaken()
     m_phone->emitSignal(Service, channel.path(), QStringLiteral("com.example.Filter"),
                         channel.wireName("Default@ActionChanged"), {2U});
     QCOMPARE(seen.take(), QStringList());
+}
+
+void RuleChannelTest::requestsAreSentBeforeTheStateIsKnown()
+{
+    QFETCH(TestedChannel, channel);
+    setServiceRules(channel, {rule("1", SimFilter::Block)}, SimFilter::Allow);
+    m_phone->takeJournal(Service);
+    m_phone->swallowCalls(Service, channel.path(), QStringLiteral("GetAll"));
+    const auto filter = channel.make();
+    QVERIFY(filter->setRule(rule("2", SimFilter::Allow)));
+    QVERIFY(filter->setRules({rule("3", SimFilter::Block)}));
+    QVERIFY(filter->setDefaultAction(SimFilter::Allow));
+    // What is known so far is compared with.
+    QVERIFY(!filter->setDefaultAction(SimFilter::Block));
+    QVERIFY(!filter->removeRule(QStringLiteral("1")));
+    QVERIFY(!filter->clearRules());
+    m_phone->settle(Service);
+    QVERIFY(!filter->ready());
+    QCOMPARE(takeCalls(channel),
+             channel.calls({"GetAll ()", "Add@Rule ('2', uint32 2)", "Set@Rules ([('3', uint32 1)],)",
+                            "SetDefault@Action (uint32 2,)"}));
 }
 
 void RuleChannelTest::requestsAreSent()
@@ -781,9 +819,10 @@ void RuleChannelTest::deletionInASlot_data()
 {
     QTest::addColumn<TestedChannel>("channel");
     QTest::addColumn<int>("survivedSignals");
-    // The service's answer causes five signals, its announcement of one more rule three.
+    // The service's answer causes five signals, its announcements of one rule more and of one less three
+    // each.
     for (const TestedChannel &channel : m_channels) {
-        for (int signal = 0; signal < 8; ++signal)
+        for (int signal = 0; signal < 11; ++signal)
             QTest::addRow("%s, signal %d", channel.names.path, signal) << channel << signal;
     }
 }
@@ -801,6 +840,7 @@ void RuleChannelTest::deletionInASlot()
     });
     QVERIFY(waitUntil([&] { return !filter || filter->ready(); }));
     emitFrom(channel, "@RuleAdded", {0U, wire("3", 1)});
+    emitFrom(channel, "@RuleRemoved", {0U});
     QVERIFY(!filter);
     m_phone->settle(Service);
     QCOMPARE(signalsSeen, survivedSignals + 1);

@@ -165,6 +165,8 @@ private Q_SLOTS:
     void ruleAddedTwice();
     void ruleChanged_data() { addChannels(); }
     void ruleChanged();
+    void ruleChangedOfAnImsiThatIsThereTwice_data() { addChannels(); }
+    void ruleChangedOfAnImsiThatIsThereTwice();
     void ruleRemoved_data() { addChannels(); }
     void ruleRemoved();
     void rulesChanged_data() { addChannels(); }
@@ -176,6 +178,8 @@ private Q_SLOTS:
     void signalsOfAnotherShapeAreNotTaken_data() { addChannels(); }
     void signalsOfAnotherShapeAreNotTaken();
 
+    void requestsAreSentBeforeTheStateIsKnown_data() { addChannels(); }
+    void requestsAreSentBeforeTheStateIsKnown();
     void requestsAreSent_data() { addChannels(); }
     void requestsAreSent();
     void hangupIsSentWhereItExists_data() { addChannels(); }

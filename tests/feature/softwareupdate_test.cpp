@@ -10,6 +10,7 @@
 #include <QtCore/QElapsedTimer>
 #include <QtTest/QtTest>
 
+#include <functional>
 #include <memory>
 #include <thread>
 
@@ -46,6 +47,7 @@ private Q_SLOTS:
     void signalsReachQueuedAndNamedConnections();
     void queriesAnswerWhatTheProxySays();
     void commandsSendTheirCalls();
+    void waitsForAnswers();
     void updateFromCheckToInstallation();
     void failureIsForwarded();
     void failingQueriesWarnAndAreEmpty();
@@ -200,6 +202,27 @@ void SoftwareUpdateTest::commandsSendTheirCalls()
                           call("downloadSoftwareUpdate", "('',)"), call("checkForSoftwareUpdate")}));
     QVERIFY(seen.waitFor(4));
     QCOMPARE(seen.take().last(), QStringLiteral("softwareUpdateInfoChanged()"));
+}
+
+void SoftwareUpdateTest::waitsForAnswers()
+{
+    constexpr int milliseconds = 200;
+    const auto waits = [this](const char *member, const std::function<void()> &act) {
+        m_phone->delayCalls(Service, Path, QLatin1String(member), milliseconds);
+        QElapsedTimer elapsed;
+        elapsed.start();
+        act();
+        const qint64 waited = elapsed.elapsed();
+        m_phone->clearFaults();
+        return waited >= milliseconds;
+    };
+    std::unique_ptr<SoftwareUpdate> update;
+    QVERIFY(waits("registerClient", [&] { update = std::make_unique<SoftwareUpdate>(); }));
+    QVERIFY(waits("checkForSoftwareUpdate", [&] { update->checkForSoftwareUpdate(); }));
+    QVERIFY(waits("softwareUpdateIsAvailable", [&] { update->softwareUpdateIsAvailable(); }));
+    QVERIFY(waits("downloadSoftwareUpdate", [&] { update->downloadSoftwareUpdate(QStringLiteral("5.1")); }));
+    QVERIFY(waits("installSoftwareUpdate", [&] { update->installSoftwareUpdate(); }));
+    QVERIFY(waits("unregisterClient", [&] { update.reset(); }));
 }
 
 void SoftwareUpdateTest::updateFromCheckToInstallation()
