@@ -12,6 +12,7 @@
 
 #include <csignal>
 #include <cstdio>
+#include <memory>
 #include <unistd.h>
 
 namespace Corvane
@@ -63,7 +64,10 @@ private:
             startNext();
             return;
         }
-        service.start([this](const QString &problem) {
+        // It may come up when this start of the phone has been given up.
+        service.start([this, life = std::weak_ptr<void>(m_life)](const QString &problem) {
+            if (life.expired())
+                return;
             if (problem.isEmpty())
                 startNext();
             else
@@ -74,6 +78,7 @@ private:
     const Services &m_services;
     const PhoneService::Done m_done;
     std::size_t m_next = 0;
+    const std::shared_ptr<void> m_life = std::make_shared<int>();
 };
 
 /** Takes the phone down and brings it up again. */
@@ -88,29 +93,37 @@ public:
             // Not from within a call: its service would go away under it.
             m_timer.start(0, [this, restart] {
                 m_phone.isOn = false;
-                stop(0, restart);
+                m_startUp.reset();
+                m_restarts = restart;
+                m_comesUp = restart;
+                if (!std::exchange(m_goesDown, true))
+                    stop(0);
             });
         };
         phone.comeUp = [this] {
-            start();
+            if (m_goesDown)
+                m_comesUp = true;
+            else
+                start();
         };
     }
 
 private:
-    void stop(std::size_t next, bool restart)
+    void stop(std::size_t next)
     {
         if (next == m_services.size()) {
-            if (restart) {
+            m_goesDown = false;
+            if (m_restarts)
                 ++m_phone.restarts;
+            if (m_comesUp)
                 start();
-            }
             return;
         }
         try {
-            m_services[next]->stop([this, next, restart](const QString &) { stop(next + 1, restart); });
+            m_services[next]->stop([this, next](const QString &) { stop(next + 1); });
         } catch (const Refusal &) {
             // A daemon that is on its way already.
-            stop(next + 1, restart);
+            stop(next + 1);
         }
     }
 
@@ -131,6 +144,10 @@ private:
     const Services &m_services;
     Timer m_timer;
     std::unique_ptr<StartUp> m_startUp;
+    bool m_goesDown = false;
+    // once it is down
+    bool m_restarts = false;
+    bool m_comesUp = false;
 };
 
 } // namespace

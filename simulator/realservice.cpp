@@ -7,6 +7,7 @@
 #include <cerrno>
 #include <csignal>
 #include <cstdio>
+#include <cstdlib>
 #include <cstring>
 #include <fcntl.h>
 #include <sys/wait.h>
@@ -45,8 +46,7 @@ RealService::~RealService()
     *m_self = nullptr;
     if (m_timer)
         g_source_remove(m_timer);
-    if (m_process)
-        g_subprocess_force_exit(m_process.get());
+    kill();
 }
 
 void RealService::start(const Done &done)
@@ -83,6 +83,10 @@ bool RealService::launch(QString &problem)
         return false;
     }
 
+    // What it starts goes with it.
+    g_subprocess_launcher_set_child_setup(
+        launcher.get(), [](gpointer) { setpgid(0, 0); }, nullptr, nullptr);
+
     std::vector<const gchar *> arguments;
     for (const std::string &argument : m_daemon.command)
         arguments.push_back(argument.c_str());
@@ -93,6 +97,7 @@ bool RealService::launch(QString &problem)
         problem = QString::fromUtf8(error->message);
         return false;
     }
+    m_group = pid_t(std::strtol(g_subprocess_get_identifier(m_process.get()), nullptr, 10));
     g_subprocess_wait_async(
         m_process.get(), nullptr,
         [](GObject *process, GAsyncResult *result, gpointer data) {
@@ -125,6 +130,8 @@ void RealService::ended(GSubprocess *process)
 {
     m_status = g_subprocess_get_status(process);
     m_process.reset();
+    kill();
+    m_group = 0;
     m_hardware->release();
     if (m_phase == Stopping) {
         advance();
@@ -172,7 +179,7 @@ void RealService::timedOut()
     m_timer = 0;
     if (m_phase == Stopping) {
         // Its end, which is then no good one, is reported.
-        g_subprocess_force_exit(m_process.get());
+        kill();
         return;
     }
     const QString waitedFor = m_phase == Appearing
@@ -183,6 +190,12 @@ void RealService::timedOut()
                .arg(m_daemon.name, waitedFor)
                .arg(bringUpTimeout)
                .arg(lastWords()));
+}
+
+void RealService::kill() const
+{
+    if (m_group > 0)
+        ::kill(-m_group, SIGKILL);
 }
 
 void RealService::finish(const QString &problem)

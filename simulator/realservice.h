@@ -6,6 +6,8 @@
 #include "phoneservice.h"
 #include "realdaemons.h"
 
+#include <sys/types.h>
+
 namespace Corvane
 {
 namespace Simulator
@@ -33,6 +35,8 @@ private:
     void advance();
     void startTimer(int seconds);
     void timedOut();
+    /** Ends the daemon and what it started. */
+    void kill() const;
     void finish(const QString &problem);
     /** How the daemon ended, and what it said last. */
     QString obituary() const;
@@ -43,6 +47,7 @@ private:
     DaemonHardware *m_hardware;
     BusConnection m_connection;
     GObjectPointer<GSubprocess> m_process;
+    pid_t m_group = 0; ///< of the daemon's processes
     Phase m_phase = Idle;
     Done m_done;
     guint m_timer = 0;

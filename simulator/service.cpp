@@ -33,7 +33,13 @@ void Service::start(const Done &done)
     for (const std::unique_ptr<Component> &component : components())
         component->attach(*this);
     // The name comes last: who sees it finds all objects.
-    m_connection->ownName(name());
+    try {
+        m_connection->ownName(name());
+    } catch (const BusError &error) {
+        disconnect();
+        done(QString::fromUtf8(error.what()));
+        return;
+    }
     done(QString());
 }
 

@@ -2,6 +2,7 @@
 #include "commands.h"
 #include "devicelocker.h"
 #include "exitstatus.h"
+#include "interruption.h"
 #include "output.h"
 #include "secretinput.h"
 #include "service.h"
@@ -9,8 +10,10 @@
 
 #include <QtCore/QSysInfo>
 
+#include <fcntl.h>
 #include <iostream>
 #include <string>
+#include <unistd.h>
 
 namespace Corvane
 {
@@ -129,8 +132,8 @@ DeviceLock::ClearOptions clearOptionsOf(const Values &values)
     return options;
 }
 
-/** Whether the person at the keyboard means this very phone. */
-bool isConfirmed(DeviceLock::ClearOptions options)
+/** Asks whether the person at the keyboard means this very phone. */
+Reply confirm(DeviceLock::ClearOptions options)
 {
     const QString device = QSysInfo::machineHostName();
     QStringList losses{QStringLiteral("the data of its user")};
@@ -145,17 +148,26 @@ bool isConfirmed(DeviceLock::ClearOptions options)
                  options.testFlag(DeviceLock::RebootAfterClear) ? QStringLiteral("restarts it")
                                                                 : QStringLiteral("shuts it down")))
               << std::flush;
+    // A standard input that has been closed cannot be waited for.
+    if (::fcntl(STDIN_FILENO, F_GETFD) != -1 && !Interruption::waitForInput(STDIN_FILENO)) {
+        std::cerr << std::endl;
+        return {Reply::Interrupted, QStringLiteral("interrupted; nothing was erased")};
+    }
     std::string line;
-    std::getline(std::cin, line);
-    return QString::fromLocal8Bit(line.c_str()).trimmed() == device;
+    if (!std::getline(std::cin, line) || ::isatty(STDIN_FILENO) == 0)
+        std::cerr << std::endl; // which nobody has typed
+    if (QString::fromLocal8Bit(line.c_str()).trimmed() == device)
+        return {};
+    return {Reply::Refused, QStringLiteral("that is not the name of this device; nothing was erased")};
 }
 
 int runWipe(DeviceLocker &locker, const Values &values)
 {
     const DeviceLock::ClearOptions options = clearOptionsOf(values);
-    if (!values.has(yesName) && !isConfirmed(options)) {
-        printError(QStringLiteral("that is not the name of this device; nothing was erased"));
-        return ExitFailed;
+    if (!values.has(yesName)) {
+        const Reply confirmed = confirm(options);
+        if (!confirmed.isDone())
+            return conclude(confirmed);
     }
     return report(locker.wipe(options), values,
                   options.testFlag(DeviceLock::RebootAfterClear)

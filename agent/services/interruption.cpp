@@ -1,6 +1,7 @@
 // SPDX-License-Identifier: LGPL-2.1-or-later
 #include "interruption.h"
 
+#include <QtCore/QEventLoop>
 #include <QtCore/QSocketNotifier>
 
 #include <csignal>
@@ -60,6 +61,18 @@ Interruption::~Interruption()
 Interruption *Interruption::instance()
 {
     return theInstance;
+}
+
+bool Interruption::waitForInput(int descriptor)
+{
+    QEventLoop loop;
+    const QSocketNotifier notifier(descriptor, QSocketNotifier::Read);
+    QObject::connect(&notifier, &QSocketNotifier::activated, &loop, &QEventLoop::quit);
+    if (theInstance)
+        QObject::connect(theInstance, &Interruption::requested, &loop, &QEventLoop::quit);
+    if (!theInstance || !theInstance->isRequested())
+        loop.exec();
+    return !theInstance || !theInstance->isRequested();
 }
 
 bool Interruption::isRequested() const

@@ -27,6 +27,9 @@ public:
     /** The object, or null. */
     static Interruption *instance();
 
+    /** Waits until @p descriptor can be read. @return false when an interruption has been requested. */
+    static bool waitForInput(int descriptor);
+
     bool isRequested() const;
 
 Q_SIGNALS:

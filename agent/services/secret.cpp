@@ -5,9 +5,6 @@
 
 #include <inputfile.h>
 
-#include <QtCore/QEventLoop>
-#include <QtCore/QSocketNotifier>
-
 #include <algorithm>
 #include <fcntl.h>
 #include <sys/prctl.h>
@@ -101,20 +98,6 @@ private:
     termios m_before = {};
 };
 
-/** @return false when an interruption came first. */
-bool waitForLine(int descriptor)
-{
-    QEventLoop loop;
-    const QSocketNotifier notifier(descriptor, QSocketNotifier::Read);
-    QObject::connect(&notifier, &QSocketNotifier::activated, &loop, &QEventLoop::quit);
-    const Interruption *interruption = Interruption::instance();
-    if (interruption)
-        QObject::connect(interruption, &Interruption::requested, &loop, &QEventLoop::quit);
-    if (!interruption || !interruption->isRequested())
-        loop.exec();
-    return !interruption || !interruption->isRequested();
-}
-
 } // namespace
 
 Secret secretFromFile(const QString &fileName)
@@ -137,7 +120,7 @@ Secret secretFromTerminal(const QString &prompt)
     if (!terminal.isSilent())
         return refused(QStringLiteral("no terminal"), QStringLiteral("to ask on"));
     terminal.write(prompt.toLocal8Bit() + ": ");
-    if (waitForLine(terminal.descriptor()))
+    if (Interruption::waitForInput(terminal.descriptor()))
         return secretFrom(QStringLiteral("what was typed"), terminal.readLine());
     terminal.write("\n");
     return {{Reply::Interrupted, QStringLiteral("interrupted")}, {}};

@@ -15,11 +15,15 @@ using Mdm::SoftwareUpdate;
 namespace
 {
 
+void fail(Wait *wait, const QString &reason)
+{
+    wait->end(Reply::Refused, QLatin1String("the phone reports: ") + reason);
+}
+
 void failWith(Wait *wait, const SoftwareUpdate *updates)
 {
-    QObject::connect(updates, &SoftwareUpdate::softwareUpdateFailed, wait, [wait](const QString &reason) {
-        wait->end(Reply::Refused, QLatin1String("the phone reports: ") + reason);
-    });
+    QObject::connect(updates, &SoftwareUpdate::softwareUpdateFailed, wait,
+                     [wait](const QString &reason) { fail(wait, reason); });
 }
 
 } // namespace
@@ -30,6 +34,8 @@ SoftwareUpdater::SoftwareUpdater(std::chrono::milliseconds timeout, QObject *par
 {
     connect(&m_updates, &SoftwareUpdate::softwareUpdateDownloadProgress, this,
             &SoftwareUpdater::downloadProgress);
+    connect(&m_updates, &SoftwareUpdate::softwareUpdateFailed, this,
+            [this](const QString &reason) { m_failure = reason; });
 }
 
 SoftwareUpdater::Offer SoftwareUpdater::offer() const
@@ -67,9 +73,18 @@ Reply SoftwareUpdater::waitUntilInstalled(const QString &version)
 {
     Wait wait(Service::mdmProxy(), m_timeout, QStringLiteral("finish the installation"));
     failWith(&wait, &m_updates);
-    wait.until(&m_updates, &SoftwareUpdate::softwareUpdateInfoChanged, [this, version] {
+    if (m_failure)
+        fail(&wait, *m_failure);
+    wait.until(&m_updates, &SoftwareUpdate::softwareUpdateInfoChanged, [this, version, &wait] {
         const Offer now = offer();
-        return now.reply.isDone() && now.version != version;
+        if (!now.reply.isDone() || now.version == version)
+            return false;
+        // One that was published in the meantime hides the end of the installation.
+        if (!now.version.isEmpty())
+            wait.end(Reply::Refused,
+                     QStringLiteral("the phone offers %1 now, and does not tell whether %2 is installed")
+                         .arg(now.version, version));
+        return true;
     });
     return wait.run();
 }
@@ -87,6 +102,7 @@ Reply SoftwareUpdater::perform(const QString &awaited, void (SoftwareUpdate::*co
     connect(&m_updates, completion, &wait, [&wait] { wait.end(Reply::Done); });
     connect(&m_updates, &SoftwareUpdate::softwareUpdateDownloading, &wait, [&wait] { wait.prolong(); });
     connect(&m_updates, &SoftwareUpdate::softwareUpdateDownloadProgress, &wait, [&wait] { wait.prolong(); });
+    m_failure.reset();
     command();
     return wait.run();
 }

@@ -10,6 +10,7 @@
 
 #include <chrono>
 #include <functional>
+#include <optional>
 
 namespace Corvane
 {
@@ -39,7 +40,7 @@ public:
     Reply download(const QString &version);
     /** Waits until the installation has begun. */
     Reply install();
-    /** Waits until @p version is on offer no more, as it is in place. */
+    /** Waits until nothing is on offer any more, as @p version is in place. */
     Reply waitUntilInstalled(const QString &version);
 
     /** The library's object, for those that follow its signals. */
@@ -54,6 +55,7 @@ private:
 
     Mdm::SoftwareUpdate m_updates;
     std::chrono::milliseconds m_timeout;
+    std::optional<QString> m_failure; ///< of what was last asked for: it may come between two waits
 };
 
 } // namespace Agent

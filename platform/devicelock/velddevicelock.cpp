@@ -11,6 +11,7 @@
 #include <QtDBus/QDBusPendingReply>
 #include <QtDBus/QDBusServiceWatcher>
 
+#include <atomic>
 #include <memory>
 
 namespace VeldDeviceLock
@@ -28,7 +29,7 @@ const QLatin1String changedMember("Changed");
 
 QDBusConnection newPeer()
 {
-    static uint count = 0;
+    static std::atomic<uint> count{0}; // over all threads
     return QDBusConnection::connectToPeer(socketAddress,
                                           QStringLiteral("org.veldmobile.devicelock.%1").arg(count++));
 }

@@ -28,16 +28,16 @@ constexpr int CodeIndex = 2;
 
 void registerTypes()
 {
-    static bool registered = false;
-    if (registered)
-        return;
-    registered = true;
-
-    qRegisterMetaType<Provisioner::AccountInfo>("Corvane::Mdm::Accounts::Provisioner::AccountInfo");
-    qDBusRegisterMetaType<Provisioner::AccountInfo>();
-    qRegisterMetaType<QList<Provisioner::AccountInfo>>(
-        "QList<Corvane::Mdm::Accounts::Provisioner::AccountInfo>");
-    qDBusRegisterMetaType<QList<Provisioner::AccountInfo>>();
+    // Other threads wait until all of it is done.
+    static const bool registered = [] {
+        qRegisterMetaType<Provisioner::AccountInfo>("Corvane::Mdm::Accounts::Provisioner::AccountInfo");
+        qDBusRegisterMetaType<Provisioner::AccountInfo>();
+        qRegisterMetaType<QList<Provisioner::AccountInfo>>(
+            "QList<Corvane::Mdm::Accounts::Provisioner::AccountInfo>");
+        qDBusRegisterMetaType<QList<Provisioner::AccountInfo>>();
+        return true;
+    }();
+    Q_UNUSED(registered)
 }
 
 /** The value at @p index if it is a T: Qt would take "true" for a bool, and 7 for a string. */

@@ -67,11 +67,9 @@ PackageDatabase::~PackageDatabase()
 
 void PackageDatabase::configure()
 {
-    static bool configured = false;
-    if (configured)
-        return;
-    configured = true;
-    rpmReadConfigFiles(nullptr, nullptr);
+    // Other threads wait until it is done.
+    static const int status = rpmReadConfigFiles(nullptr, nullptr);
+    Q_UNUSED(status)
 }
 
 QList<PackageEntry> PackageDatabase::packages() const

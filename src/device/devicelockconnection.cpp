@@ -5,6 +5,8 @@
 #include <QtDBus/QDBusConnection>
 #include <QtDBus/QDBusError>
 
+#include <atomic>
+
 namespace Corvane
 {
 namespace Mdm
@@ -21,7 +23,7 @@ const QLatin1String ManagementInterface("org.corvaneos.devicelock.DeviceManageme
 /** Never under a name that another one in this process has, or has had: QtDBus would hand out that one. */
 QDBusConnection openPeerConnection()
 {
-    static uint count = 0;
+    static std::atomic<uint> count{0}; // over all threads
     return QDBusConnection::connectToPeer(SocketAddress, QStringLiteral("org.corvaneos.mdm.%1").arg(count++));
 }
 

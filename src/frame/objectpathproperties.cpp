@@ -26,15 +26,15 @@ const QDBusArgument &operator>>(const QDBusArgument &in, ObjectPathProperties &o
 
 void registerObjectPathProperties()
 {
-    static bool registered = false;
-    if (registered)
-        return;
-    registered = true;
-
-    qRegisterMetaType<ObjectPathProperties>("Corvane::Mdm::ObjectPathProperties");
-    qDBusRegisterMetaType<ObjectPathProperties>();
-    qRegisterMetaType<ObjectPathPropertiesList>("Corvane::Mdm::ObjectPathPropertiesList");
-    qDBusRegisterMetaType<ObjectPathPropertiesList>();
+    // Other threads wait until all of it is done.
+    static const bool registered = [] {
+        qRegisterMetaType<ObjectPathProperties>("Corvane::Mdm::ObjectPathProperties");
+        qDBusRegisterMetaType<ObjectPathProperties>();
+        qRegisterMetaType<ObjectPathPropertiesList>("Corvane::Mdm::ObjectPathPropertiesList");
+        qDBusRegisterMetaType<ObjectPathPropertiesList>();
+        return true;
+    }();
+    Q_UNUSED(registered)
 }
 
 } // namespace Mdm

@@ -294,25 +294,25 @@ QStringList SimFilterPrivate::removedImsis(const SimFilter::RuleList &oldRules,
 
 void SimFilterPrivate::registerTypes()
 {
-    static bool registered = false;
-    if (registered)
-        return;
-    registered = true;
+    // Other threads wait until all of it is done.
+    static const bool registered = [] {
+        qRegisterMetaType<SimFilter::Rule>("Corvane::Mdm::SimFilter::Rule");
+        qRegisterMetaType<SimFilter::RuleList>("Corvane::Mdm::SimFilter::RuleList");
+        qRegisterMetaType<RulePrivate>("Corvane::Mdm::SimFilterPrivate::RulePrivate");
+        qDBusRegisterMetaType<RulePrivate>();
+        qRegisterMetaType<Rule>("Corvane::Mdm::SimFilterPrivate::Rule");
+        qRegisterMetaType<RulePrivateList>("Corvane::Mdm::SimFilterPrivate::RulePrivateList");
+        qDBusRegisterMetaType<RulePrivateList>();
+        qRegisterMetaType<RuleList>("Corvane::Mdm::SimFilterPrivate::RuleList");
 
-    qRegisterMetaType<SimFilter::Rule>("Corvane::Mdm::SimFilter::Rule");
-    qRegisterMetaType<SimFilter::RuleList>("Corvane::Mdm::SimFilter::RuleList");
-    qRegisterMetaType<RulePrivate>("Corvane::Mdm::SimFilterPrivate::RulePrivate");
-    qDBusRegisterMetaType<RulePrivate>();
-    qRegisterMetaType<Rule>("Corvane::Mdm::SimFilterPrivate::Rule");
-    qRegisterMetaType<RulePrivateList>("Corvane::Mdm::SimFilterPrivate::RulePrivateList");
-    qDBusRegisterMetaType<RulePrivateList>();
-    qRegisterMetaType<RuleList>("Corvane::Mdm::SimFilterPrivate::RuleList");
-
-    // Signals are declared with the short spellings; connections by name and queued ones look them up.
-    qRegisterMetaType<SimFilter::Rule>("SimFilter::Rule");
-    qRegisterMetaType<SimFilter::RuleList>("SimFilter::RuleList");
-    qRegisterMetaType<SimFilter::Action>("Corvane::Mdm::SimFilter::Action");
-    qRegisterMetaType<SimFilter::Action>("SimFilter::Action");
+        // Signals are declared with the short spellings; connections by name and queued ones look them up.
+        qRegisterMetaType<SimFilter::Rule>("SimFilter::Rule");
+        qRegisterMetaType<SimFilter::RuleList>("SimFilter::RuleList");
+        qRegisterMetaType<SimFilter::Action>("Corvane::Mdm::SimFilter::Action");
+        qRegisterMetaType<SimFilter::Action>("SimFilter::Action");
+        return true;
+    }();
+    Q_UNUSED(registered)
 }
 
 } // namespace Mdm

@@ -258,14 +258,14 @@ SimInfoPrivate::~SimInfoPrivate() = default;
 
 void SimInfoPrivate::registerTypes()
 {
-    static bool registered = false;
-    if (registered)
-        return;
-    registered = true;
-
-    qRegisterMetaType<SimInfo::SimState>("Corvane::Mdm::SimInfo::SimState");
-    // The signal is declared with the short spelling; connections by name and queued ones look it up.
-    qRegisterMetaType<SimInfo::SimState>("SimInfo::SimState");
+    // Other threads wait until all of it is done.
+    static const bool registered = [] {
+        qRegisterMetaType<SimInfo::SimState>("Corvane::Mdm::SimInfo::SimState");
+        // The signal is declared with the short spelling; connections by name and queued ones look it up.
+        qRegisterMetaType<SimInfo::SimState>("SimInfo::SimState");
+        return true;
+    }();
+    Q_UNUSED(registered)
 }
 
 void SimInfoPrivate::modemReadyChanged(bool ready)

@@ -1,6 +1,7 @@
 // SPDX-License-Identifier: LGPL-2.1-or-later
 #include "mdmctl.h"
 #include "phone.h"
+#include "terminal.h"
 #include "waiting.h"
 
 #include <QtCore/QFile>
@@ -65,6 +66,7 @@ private Q_SLOTS:
     void codeIsNowhereToBeSeen();
     void codeIsRefused();
     void wipeWantsTheName();
+    void wipeIsInterrupted();
     void wipeShutsDown();
     void wipeRestarts();
     void wipeIsRefused();
@@ -243,12 +245,26 @@ void MdmctlLockTest::wipeWantsTheName()
             QStringLiteral(
                 "This erases the data of its user, the data partition as a whole, memory cards on \"%1\", "
                 "for good, and then restarts it.\n"
-                "Type the name of the device to go on: "
+                "Type the name of the device to go on: \n"
                 "mdmctl: that is not the name of this device; nothing was erased\n")
                 .arg(QSysInfo::machineHostName()));
         QCOMPARE(asked.status, 1);
     }
     QVERIFY(!userFiles().isEmpty());
+    QVERIFY(m_phone.takeJournal(Service).filter(QStringLiteral("ClearDevice")).isEmpty());
+}
+
+void MdmctlLockTest::wipeIsInterrupted()
+{
+    Terminal terminal;
+    Mdmctl wipe({QStringLiteral("lock"), QStringLiteral("wipe")}, &terminal);
+    const QString prompt = QStringLiteral("Type the name of the device to go on: ");
+    QVERIFY(wipe.waitForErrors(prompt));
+    terminal.type("\x03");
+    const Mdmctl::Result ended = wipe.finish();
+    QVERIFY2(ended.errors.endsWith(prompt + QLatin1String("\nmdmctl: interrupted; nothing was erased\n")),
+             qPrintable(ended.errors));
+    QCOMPARE(ended.status, 1);
     QVERIFY(m_phone.takeJournal(Service).filter(QStringLiteral("ClearDevice")).isEmpty());
 }
 

@@ -43,6 +43,7 @@ private Q_SLOTS:
     void offersTheContracts_data();
     void offersTheContracts();
     void stopsAndStartsServices();
+    void startsNoServiceWhoseNameIsTaken();
     void leavesCallsOfAStoppedServiceUnanswered();
     void failsCalls();
     void answersLate();
@@ -185,6 +186,23 @@ void ControlTest::stopsAndStartsServices()
         QVERIFY(answer.startsWith(refused + QStringLiteral("There is no service \"org.x\"; there are ")));
         QVERIFY(answer.contains(QLatin1String("org.corvaneos.mdmproxy, ")));
     }
+}
+
+void ControlTest::startsNoServiceWhoseNameIsTaken()
+{
+    QCOMPARE(control(QStringLiteral("StopService"), {ofono}), done);
+    const QString bus = QStringLiteral("org.freedesktop.DBus");
+    const QString busPath = QStringLiteral("/org/freedesktop/DBus");
+    QCOMPARE(textOf(m_client->call(bus, busPath, bus, QStringLiteral("RequestName"), {ofono, 0u})),
+             QStringLiteral("reply(1)"));
+    const QString answer = control(QStringLiteral("StartService"), {ofono});
+    QVERIFY2(answer.endsWith(QLatin1String("the name org.ofono is taken on the phone's bus")),
+             qPrintable(answer));
+    QVERIFY(control(QStringLiteral("Services")).contains(QLatin1String("(org.ofono, false)")));
+    QCOMPARE(textOf(m_client->call(bus, busPath, bus, QStringLiteral("ReleaseName"), {ofono})),
+             QStringLiteral("reply(1)"));
+    QCOMPARE(control(QStringLiteral("StartService"), {ofono}), done);
+    QCOMPARE(filterCall(), all);
 }
 
 void ControlTest::leavesCallsOfAStoppedServiceUnanswered()

@@ -66,6 +66,44 @@ expect "status with a daemon that dies" $status 125
 contains "message" "$text" "corvane-simulator: /usr/sbin/ofonod was ended by signal 9; stock-ofono said:"
 contains "services after that" "$(tr -s ' ' <<< "$text")" "org.ofono running"
 
+# What a daemon has started goes with it, and keeps no name.
+status=0
+text=$("$simulator" --real upower -- timeout 60 sh -c '
+    kill -9 "$(pidof umockdev-run)"
+    until corvane-simctl services | grep -q "org.freedesktop.UPower *stopped"; do :; done
+    corvane-simctl start org.freedesktop.UPower
+    corvane-simctl services' 2>&1) || status=$?
+expect "status with a daemon whose wrapper dies" $status 125
+contains "services after that" "$(tr -s ' ' <<< "$text")" "org.freedesktop.UPower running"
+
+# Wiped again while the daemon comes up, which it does at last.
+expect "restarts" "$("$simulator" --real connman -- timeout 60 bash -c '
+    corvane-simctl act cable unplug eth0
+    corvane-simctl act cable unplug dummy0
+    for count in 1 2; do
+        mdmctl lock wipe --yes --reboot >/dev/null
+        until [[ $(corvane-simctl state restarts) == *" $count" ]]; do :; done
+    done
+    corvane-simctl act cable plug eth0
+    corvane-simctl act cable plug dummy0
+    until [[ $(gdbus call --system -d net.connman -o / -m net.connman.Manager.GetServices) == *_cable*ready* ]]; do
+        :
+    done
+    corvane-simctl state restarts' 2>&1 | tr -s ' ')" "restarts 2"
+
+# Switched on while it goes down.
+# shellcheck disable=SC2016
+text=$("$simulator" --real connman -- timeout 60 bash -c '
+    first=$(pidof connmand)
+    kill -STOP "$first"
+    mdmctl lock wipe --yes >/dev/null
+    until [[ $(corvane-simctl state power) == *off ]]; do :; done
+    corvane-simctl act power on
+    kill -CONT "$first"
+    while second=$(pidof connmand) || true; [[ -z $second || $second == "$first" ]]; do :; done
+    corvane-simctl act power on' 2>&1) || true
+contains "a phone that is on with a new daemon" "$text" "The phone is on already"
+
 # In a phone the daemon can be taken away, by root, without anybody missing it.
 if [[ $EUID -eq 0 ]]; then
     status=0
