@@ -56,7 +56,6 @@ private Q_SLOTS:
     void progressBarOnATerminal();
     void failureOnATerminalLeavesTheBarsLine();
     void installBeginsOrWaits();
-    void installationThatFailsAtOnce();
     void newerUpdateHidesTheEndOfTheInstallation();
     void installOfNothingFails();
     void queryThatFailsIsTold();
@@ -307,23 +306,6 @@ void MdmctlUpdateTest::installBeginsOrWaits()
              QJsonObject({{QStringLiteral("installed"), false},
                           {QStringLiteral("started"), true},
                           {QStringLiteral("version"), m_version}}));
-}
-
-void MdmctlUpdateTest::installationThatFailsAtOnce()
-{
-    standIn("installSoftwareUpdate");
-    // Both are often taken up in one go, which is where the second was lost.
-    for (int round = 0; round < 5; ++round) {
-        Mdmctl install(QStringLiteral("update install --wait").split(QLatin1Char(' ')));
-        QVERIFY(waitForCall(Path + QStringLiteral(" installSoftwareUpdate ()")));
-        m_phone.sendSignal(Service, Path, Interface, QStringLiteral("softwareUpdateInstallationStarted"));
-        m_phone.sendSignal(Service, Path, Interface, QStringLiteral("softwareUpdateFailed"),
-                           {QStringLiteral("No room")});
-        const Mdmctl::Result failed = install.finish();
-        QCOMPARE(failed.errors, QStringLiteral("mdmctl: the phone reports: No room\n"));
-        QCOMPARE(failed.output, QString());
-        QCOMPARE(failed.status, 1);
-    }
 }
 
 void MdmctlUpdateTest::newerUpdateHidesTheEndOfTheInstallation()
