@@ -111,7 +111,10 @@ public:
     /** In DBusMode always; in NetworkManagerMode while the connection manager has Wi-Fi. */
     bool ready() const;
 
-    /** False (and, in DBusMode, a warning) also when it is not known. DBusMode blocks. */
+    /**
+     * DBusMode blocks; false, with a warning, also when it cannot be read. NetworkManagerMode: false until it
+     * is known, and as it last was while the connection manager is away.
+     */
     bool flightModeEnabled() const;
 
     /** False (and, in DBusMode, a warning) also when it is not known. DBusMode blocks. */

@@ -22,8 +22,9 @@ class SimInfoPrivate;
  * @brief Tells what is in each SIM slot of the phone, and announces each change.
  *
  * The states are mirrored: they arrive after construction, with simStateChanged(), and are kept up from then
- * on. The queries that return a list of slots ask the service instead: they block until it has answered, for
- * QtDBus's default timeout (25 s) at most with each question.
+ * on. Looking up a modem's objects blocks, in the constructor or in the event loop. The queries that return a
+ * list of slots ask the service instead: they block until it has answered, for QtDBus's default timeout (25
+ * s) at most with each question, and as long once more when it does not even describe the object.
  *
  * While the telephony service is away or not ready the last states are kept; available() tells. A service
  * without the extension for several SIMs has no states to tell, and queries find nothing.
@@ -113,11 +114,13 @@ public:
         QString value; ///< what was asked for
     };
 
-    /** Follows the service from now on; what it knows arrives later. */
+    /** Follows the service from now on; what it knows arrives later, unless another object of the thread has
+     * been told already. */
     explicit SimInfo(QObject *parent = nullptr);
     ~SimInfo() override;
 
-    /** False until availableChanged(). */
+    /** Whether the service is there and has told its modems; false at first, unless another object of the
+     * thread has been told already. */
     bool available() const;
 
     /** What is known of each slot, by modem path; also of those whose modem has gone. */

@@ -5,6 +5,7 @@
 #include <QtCore/QVariant>
 #include <QtCore/QVariantList>
 #include <QtCore/QVariantMap>
+#include <QtDBus/QDBusArgument>
 #include <QtDBus/QDBusMetaType>
 #include <QtDBus/QDBusObjectPath>
 #include <QtDBus/QDBusSignature>
@@ -37,6 +38,9 @@ inline bool isMarshallable(const QVariant &value)
         return all(value.toHash());
     if (value.userType() == qMetaTypeId<QDBusVariant>())
         return isMarshallable(value.value<QDBusVariant>().variant());
+    // As a service has sent it: that can be sent again. One for writing need not be one value.
+    if (value.userType() == qMetaTypeId<QDBusArgument>())
+        return value.value<QDBusArgument>().currentType() != QDBusArgument::UnknownType;
     if (value.userType() == qMetaTypeId<QDBusObjectPath>())
         return !value.value<QDBusObjectPath>().path().isEmpty();
     if (value.userType() == qMetaTypeId<QDBusSignature>())

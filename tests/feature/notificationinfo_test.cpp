@@ -203,6 +203,7 @@ private Q_SLOTS:
     void typesThatNoActionHas();
     void whatIsLeftAlone();
     void oneMalformedActionSparesTheOthers();
+    void whatWasReadCanBeSentAgain();
     void actionsThatCannotBeSent_data();
     void actionsThatCannotBeSent();
     void errorsGiveEmptyValues();
@@ -564,6 +565,35 @@ void NotificationInfoTest::oneMalformedActionSparesTheOthers()
     QCOMPARE(read.at(1).remoteActions.first().toMap(), good);
 }
 
+void NotificationInfoTest::whatWasReadCanBeSentAgain()
+{
+    const QString key = QStringLiteral("key");
+    const QVariant odd = variant(QList<Numbers>{{1, 2}});
+    const QVariantList actions{odd, QVariantMap{{key, odd}}, QVariantMap{{key, QVariantList{1}}}};
+    MessageLog log;
+    NotificationInfo info;
+    const uint id = info.createNotification(dataNamed(QStringLiteral("Odd")));
+    NotificationData data = answeredWith({wireNotification(id, actions)}).value(0);
+    QVERIFY(isRaw(data.remoteActions.value(0)));
+    QCOMPARE(log.takeWarnings().size(), 2);
+    m_phone->clearFaults();
+    m_phone->takeJournal(Service);
+
+    data.body = QStringLiteral("changed");
+    QCOMPARE(info.updateNotification(id, data), id);
+    const uint other = info.createNotification(data);
+    QVERIFY(other != 0);
+    const QStringList calls = m_phone->takeJournal(Service);
+    QCOMPARE(calls.size(), 2);
+    for (const QString &call : calls) {
+        QVERIFY2(call.contains(QLatin1String("[<[(1, 2)]>, <{'key': <[(1, 2)]>}>, <{'key': <[<1>]>}>]")),
+                 qPrintable(call));
+    }
+    QCOMPARE(log.takeWarnings(), QStringList());
+    QVERIFY(info.closeNotification(id));
+    QVERIFY(info.closeNotification(other));
+}
+
 void NotificationInfoTest::actionsThatCannotBeSent_data()
 {
     QTest::addColumn<QVariantList>("actions");
@@ -577,6 +607,7 @@ void NotificationInfoTest::actionsThatCannotBeSent_data()
     QTest::newRow("empty path") << QVariantList{variant(QDBusObjectPath())};
     QTest::newRow("empty signature") << QVariantList{variant(QDBusSignature())};
     QTest::newRow("no file") << QVariantList{variant(QDBusUnixFileDescriptor())};
+    QTest::newRow("nothing read") << QVariantList{variant(QDBusArgument())};
     QTest::newRow("in a box") << QVariantList{variant(QDBusVariant(unknown))};
 }
 
