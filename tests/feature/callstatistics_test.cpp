@@ -79,6 +79,7 @@ private Q_SLOTS:
     void resultsBecomeUtcTimes();
     void timesThatNoDateHas();
     void failureHasNoResults();
+    void signalOfAnotherClientIsNotTaken();
     void signalsOfAnotherShapeAreNotTaken();
     void everyObjectGetsEveryAnswer();
     void severalSearchesAtATime();
@@ -265,6 +266,17 @@ void CallStatisticsTest::failureHasNoResults()
     emitFinished(false, {});
     emitFinished(false, {{0, 1}});
     QCOMPARE(seen.take(), texts({"searchFinished(false, [])", "searchFinished(false, [])"}));
+}
+
+void CallStatisticsTest::signalOfAnotherClientIsNotTaken()
+{
+    CallStatistics statistics;
+    SignalSequence seen(&statistics);
+    const QVariantList arguments{true, wire({{0, 1}})};
+    m_phone->forgeSignal(Service, Path, Interface, QStringLiteral("searchFinished"), arguments);
+    QCOMPARE(seen.take(), QStringList());
+    m_phone->emitSignal(Service, Path, Interface, QStringLiteral("searchFinished"), arguments);
+    QCOMPARE(seen.take().size(), 1);
 }
 
 void CallStatisticsTest::signalsOfAnotherShapeAreNotTaken()

@@ -1436,6 +1436,11 @@ void ConnectivitySettingsTest::wlanThatComesAndGoes()
                         {bluetooth});
     QCOMPARE(seen.take(), QStringList());
 
+    // Nor does what another client says.
+    m_phone->forgeSignal(Connman, WlanPath, TechnologyInterface, PropertyChanged,
+                         {QStringLiteral("Powered"), variantOf(false)});
+    QCOMPARE(seen.take(), QStringList());
+
     m_phone->emitSignal(Connman, WlanPath, TechnologyInterface, PropertyChanged,
                         {QStringLiteral("Powered"), variantOf(false)});
     QCOMPARE(seen.take(), texts({"wlanEnabledChanged()"}));

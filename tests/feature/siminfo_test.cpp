@@ -103,6 +103,8 @@ private Q_SLOTS:
     void providerAloneIsNoChange();
     void numbersAloneAreNoChange();
     void cardAloneIsNoChange();
+    void eachPartIsFollowed_data();
+    void eachPartIsFollowed();
     void otherPropertiesAreNoChange();
     void pulledAndInserted();
     void anotherSimIsInserted();
@@ -120,6 +122,7 @@ private Q_SLOTS:
     void notReadyWithEverythingInFlight();
     void readyAgainStartsAnew();
     void lateSignalsAreForgotten();
+    void removedModemIsNotAskedAgain();
     void deletedInFlight_data();
     void deletedInFlight();
     void deletedByAReceiver();
@@ -644,6 +647,48 @@ void SimInfoTest::cardAloneIsNoChange()
     QCOMPARE(info.simSlotStates().at(0).cardIdentifier, QStringLiteral("8935805100000012345"));
 }
 
+void SimInfoTest::eachPartIsFollowed_data()
+{
+    QTest::addColumn<QString>("interface");
+    QTest::addColumn<QString>("member");
+    QTest::addColumn<QVariantList>("arguments");
+    QTest::addColumn<QString>("state");
+    const QString pending = QStringLiteral("/ril_0 present voice data enabled pin:-1 net:1 244051234567890");
+    const QString simManager = QStringLiteral("org.ofono.SimManager");
+    const QString simInfo = QStringLiteral("org.veldmobile.ofono.SimInfo");
+    const QString property = QStringLiteral("PropertyChanged");
+    const auto arguments = [](const char *name, const QVariant &value) {
+        return QVariantList{QString::fromLatin1(name), QVariant::fromValue(QDBusVariant(value))};
+    };
+    QTest::newRow("numbers") << simManager << property
+                             << arguments("SubscriberNumbers", QStringList(QStringLiteral("1"))) << pending;
+    QTest::newRow("IMSI of the SIM manager")
+        << simManager << property << arguments("SubscriberIdentity", QStringLiteral("1")) << pending;
+    QTest::newRow("presence") << simManager << property << arguments("Present", false)
+                              << QStringLiteral("/ril_0 voice data enabled pin:-1 net:1 244051234567890");
+    QTest::newRow("card") << simInfo << QStringLiteral("CardIdentifierChanged")
+                          << QVariantList{QStringLiteral("89")} << pending;
+    QTest::newRow("IMSI") << simInfo << QStringLiteral("SubscriberIdentityChanged")
+                          << QVariantList{QStringLiteral("1")}
+                          << QStringLiteral("/ril_0 present enabled pin:-1 net:1 1");
+}
+
+void SimInfoTest::eachPartIsFollowed()
+{
+    QFETCH(QString, interface);
+    QFETCH(QString, member);
+    QFETCH(QVariantList, arguments);
+    QFETCH(QString, state);
+    SimInfo info;
+    QVERIFY(waitForStates(info, {Sim0, Sim1}));
+    SignalSequence seen(&info);
+    // Nobody looks at this one before something else changes, so that whatever is heard of shows.
+    m_phone->emitSignal(Service, Root, ModemManager, QStringLiteral("PresentSimsChanged"), {0, false});
+    QCOMPARE(seen.take(), QStringList());
+    m_phone->emitSignal(Service, Modem0, interface, member, arguments);
+    QCOMPARE(seen.take(), QStringList(changed(state)));
+}
+
 void SimInfoTest::otherPropertiesAreNoChange()
 {
     SimInfo info;
@@ -897,6 +942,21 @@ void SimInfoTest::lateSignalsAreForgotten()
         {QStringLiteral("Interfaces"),
          QVariant::fromValue(QDBusVariant(QStringList(QStringLiteral("org.ofono.NetworkRegistration"))))});
     QVERIFY(waitForStates(info, {Sim0, Empty1}));
+}
+
+void SimInfoTest::removedModemIsNotAskedAgain()
+{
+    SimInfo info;
+    QVERIFY(waitForStates(info, {Sim0, Sim1}));
+    m_phone->emitSignal(Service, Root, QStringLiteral("org.ofono.Manager"), QStringLiteral("ModemRemoved"),
+                        {QVariant::fromValue(QDBusObjectPath(Modem1))});
+    m_phone->takeJournal(Service);
+    for (const QStringList &interfaces :
+         {QStringList(), QStringList(QStringLiteral("org.ofono.NetworkRegistration"))}) {
+        m_phone->emitSignal(Service, Modem1, ModemInterface, QStringLiteral("PropertyChanged"),
+                            {QStringLiteral("Interfaces"), QVariant::fromValue(QDBusVariant(interfaces))});
+    }
+    QCOMPARE(m_phone->takeJournal(Service).filter(Modem1), QStringList());
 }
 
 void SimInfoTest::deletedInFlight_data()

@@ -47,6 +47,10 @@ public:
     void emitSignal(const QString &service, const QString &path, const QString &interface,
                     const QString &member, const QVariantList &arguments = QVariantList());
 
+    /** Another client of the bus emits what only @p service may; waits as emitSignal() does. */
+    void forgeSignal(const QString &service, const QString &path, const QString &interface,
+                     const QString &member, const QVariantList &arguments = QVariantList());
+
     /**
      * Waits until this process has taken in all that @p service has sent to it so far: what it sends is
      * delivered in order, so the answer to one more call comes last.
