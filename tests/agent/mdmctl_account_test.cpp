@@ -43,6 +43,7 @@ private Q_SLOTS:
     void mistakesSendNothing_data();
     void mistakesSendNothing();
     void refusalsAreTold();
+    void silenceIsTold();
     void deletesSeveral();
     void absenceIsTold();
     void secretsStaySecret();
@@ -261,6 +262,17 @@ void MdmctlAccountTest::refusalsAreTold()
     const Mdmctl::Result denied = run(QStringLiteral("list"));
     QCOMPARE(denied.errors, Refused + QStringLiteral("not you\n"));
     QCOMPARE(denied.status, 1);
+}
+
+void MdmctlAccountTest::silenceIsTold()
+{
+    m_phone.failCalls(Service, Path, QString(), QStringLiteral("org.freedesktop.DBus.Error.NoReply"),
+                      QStringLiteral("Did not receive a reply. Possible causes include: the remote "
+                                     "application did not send a reply"));
+    const Mdmctl::Result silent = run(QStringLiteral("list"));
+    QCOMPARE(silent.errors,
+             QStringLiteral("mdmctl: the MDM proxy (org.corvaneos.mdmproxy) did not answer within 25 s\n"));
+    QCOMPARE(silent.status, 1);
 }
 
 void MdmctlAccountTest::deletesSeveral()
