@@ -63,10 +63,8 @@ Report reportOf(const LocationInfo &info)
 void request(Wait *wait, const std::function<void()> &request)
 {
     const Reply reply = ask(Service::mdmProxy(), failures, request);
-    if (!reply.isDone()) {
-        wait->end(reply.outcome,
-                  reply.outcome == Reply::Refused ? Service::mdmProxy().refusal(reply.text) : reply.text);
-    }
+    if (!reply.isDone())
+        wait->end(reply.outcome, reply.text);
 }
 
 int runOnce(LocationInfo &info, const Values &values)
