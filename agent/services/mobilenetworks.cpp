@@ -37,6 +37,10 @@ const QVector<Failure> &failures()
                         "technology|get contexts|set the default data SIM|get access point settings): "
                         "\"(.*)\"$"),
          refused, telephony},
+        // The way to the access points of one SIM is an interface that a stock service lacks.
+        {QStringLiteral(
+             R"re(^Unable to set the default data SIM: "(?:No such interface |Method .* doesn't exist))re"),
+         SimCards::untold().text, telephony},
         {QStringLiteral("^Unable to set (.*) for the given IMSI: "),
          telephony.toString() + QLatin1String(" did not take the %1"), telephony},
         {QStringLiteral("^(?:No such modem path|Unsupported cellular technologies selection)"),
