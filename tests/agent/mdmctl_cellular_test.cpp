@@ -185,6 +185,7 @@ void MdmctlCellularTest::mistakes_data()
         QTest::newRow(arguments) << QString::fromUtf8(message) << status;
     };
     row("cellular select /ril_0 4G", R"(TECHNOLOGY "4G": did you mean "4g"?)", 2);
+    row("cellular select /ril_0 5g", R"(TECHNOLOGY "5g": must be one of "any", "2g", "3g", "4g")", 2);
     row("cellular select /ril_7 4g",
         R"(no modem or SIM /ril_7 in the phone; "mdmctl cellular technologies" lists them)", 1);
     row("cellular connect me", R"(IMSI "me": must be 1 to 15 decimal digits)", 2);
@@ -197,7 +198,8 @@ void MdmctlCellularTest::mistakes_data()
     row("apn set 244051234567890 web --apn x", R"(TYPE "web": must be one of "internet", "mms", "ims")", 2);
     row("apn set 244051234567890 internet", R"(nothing to set; "mdmctl apn set --help" lists the options)",
         2);
-    row("apn set 244051234567890 internet --protocol ipv7", R"(--protocol "ipv7": did you mean "ipv6"?)", 2);
+    row("apn set 244051234567890 internet --protocol ipv7",
+        R"(--protocol "ipv7": must be one of "ip", "ipv6", "dual")", 2);
     row("apn set 244051234567890 internet --password geheim",
         R"(unknown option "--password": did you mean "--password-file"?)", 2);
     row("apn set 244051234567890 internet --password-env A --password-file b",
