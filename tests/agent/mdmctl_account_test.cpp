@@ -42,6 +42,8 @@ private Q_SLOTS:
     void passwordComesFromAnywhereButArguments();
     void mistakesSendNothing_data();
     void mistakesSendNothing();
+    void brokenConfigurationIsTold_data();
+    void brokenConfigurationIsTold();
     void refusalsAreTold();
     void silenceIsTold();
     void deletesSeveral();
@@ -236,7 +238,9 @@ void MdmctlAccountTest::mistakesSendNothing_data()
     row("create-email a@b --password-file x --password-env Y",
         "--password-file and --password-env exclude each other");
     row("create p s", "USER is missing; usage: mdmctl account create PROVIDER SERVICE USER");
-    row("create p s u --configuration /dev/null", "/dev/null: must hold a JSON object");
+    row("create p s u --configuration /dev/null", "/dev/null: is empty, must be a JSON object");
+    row("create p s u --configuration /nowhere.json",
+        "/nowhere.json: cannot be read: No such file or directory");
     row("delete", "ID is missing; usage: mdmctl account delete ID...");
     row("delete 1 x", R"(ID "x": must be the number of an account, as in "mdmctl account list")");
     row("delete 0", R"(ID "0": must be the number of an account, as in "mdmctl account list")");
@@ -248,6 +252,27 @@ void MdmctlAccountTest::mistakesSendNothing()
     const Mdmctl::Result refused = run(QString::fromUtf8(QTest::currentDataTag()));
     QCOMPARE(refused.errors, QStringLiteral("mdmctl: %1\n").arg(message));
     QCOMPARE(refused.output, QString());
+    QCOMPARE(refused.status, 2);
+    QCOMPARE(m_phone.takeJournal(Service), QStringList());
+}
+
+void MdmctlAccountTest::brokenConfigurationIsTold_data()
+{
+    QTest::addColumn<QByteArray>("content");
+    QTest::addColumn<QString>("message");
+
+    QTest::newRow("syntax") << QByteArray("{\n  \"host\": h\n}") << ":2:10: illegal number";
+    QTest::newRow("array") << QByteArray("[]") << ": must be a JSON object, is an array";
+}
+
+void MdmctlAccountTest::brokenConfigurationIsTold()
+{
+    QFETCH(QByteArray, content);
+    QFETCH(QString, message);
+    const QString configuration = file("configuration", content);
+    const Mdmctl::Result refused = run(
+        QStringLiteral("create p s u --configuration %1 --password-file %2").arg(configuration, m_password));
+    QCOMPARE(refused.errors, QStringLiteral("mdmctl: %1%2\n").arg(configuration, message));
     QCOMPARE(refused.status, 2);
     QCOMPARE(m_phone.takeJournal(Service), QStringList());
 }
