@@ -88,6 +88,12 @@ void MdmctlUsageTest::helpTeachesAtEachLevel_data()
                        QStringLiteral("mdmctl data set 244")};
     QTest::newRow("search") << "call-statistics search"
                             << QStringList{QStringLiteral("--from TIME"), QStringLiteral("\"results\"")};
+    for (const char *family : {"calls", "sms", "data"}) {
+        for (const char *command : {"remove", "clear"}) {
+            const QString words = QStringLiteral("%1 %2").arg(QLatin1String(family), QLatin1String(command));
+            QTest::newRow(qPrintable(words)) << words << QStringList{QStringLiteral("\"rules\": []}\n")};
+        }
+    }
     QTest::newRow("several") << "calls set" << QStringList{QStringLiteral("DIR IMSI=ACTION...")};
 }
 
