@@ -94,6 +94,8 @@ void MdmctlUsageTest::helpTeachesAtEachLevel_data()
             QTest::newRow(qPrintable(words)) << words << QStringList{QStringLiteral("\"rules\": []}\n")};
         }
     }
+    QTest::newRow("switched off") << "location once"
+                                  << QStringList{QStringLiteral("mdmctl location settings")};
     QTest::newRow("several") << "calls set" << QStringList{QStringLiteral("DIR IMSI=ACTION...")};
 }
 
