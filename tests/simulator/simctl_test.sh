@@ -98,5 +98,6 @@ says 1 'corvane-simctl: "package publish" takes .*; it was given 1 argument' act
 says 2 'corvane-simctl: there is no command "jurnal"; did you mean "journal"\?' jurnal
 says 2 'corvane-simctl: A subcommand is required; .*'
 says 0 '.*Examples:.*' --help
+says 0 'corvane-simctl [0-9]+\.[0-9]+\.[0-9]+' --version
 
 [[ $failures -eq 0 ]]
