@@ -432,9 +432,9 @@ void MdmctlAccountTest::policyDriftIsPutRight()
                   QStringLiteral("0.2")});
     QVERIFY(watch.waitForOutput(QStringLiteral("Watching for drift")));
     // Nobody announces this.
-    QCOMPARE(
-        run(QStringLiteral("create corvane-cloud corvane-cloud-sync lena --password-file ") + m_password).status,
-        0);
+    QCOMPARE(run(QStringLiteral("create corvane-cloud corvane-cloud-sync lena --password-file ") + m_password)
+                 .status,
+             0);
     QVERIFY(watch.waitForOutput(QStringLiteral("accounts.corvane-cloud.lena: changed (remove it)")));
     watch.interrupt(SIGINT);
     QCOMPARE(watch.finish().status, 0);
