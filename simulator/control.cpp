@@ -77,7 +77,9 @@ Control::Control(std::vector<std::unique_ptr<PhoneService>> &services, Journal &
                  const guint32 id = call.number(0);
                  if (!m_faults.remove(id))
                      throw Refusal(
-                         QStringLiteral("There is no fault %1; Faults() lists those that are set").arg(id));
+                         QStringLiteral(
+                             "There is no fault %1; \"corvane-simctl faults\" lists those that are set")
+                             .arg(id));
                  call.reply();
              }},
             {QStringLiteral("ClearFaults"),
@@ -216,9 +218,10 @@ QString Control::act(const QString &name, const QStringList &arguments) const
                     continue;
                 if (arguments.size() < action.minimumArguments
                     || arguments.size() > action.maximumArguments) {
-                    throw Refusal(QStringLiteral("\"%1\" takes %2; it was given %3 arguments")
-                                      .arg(name, action.usage)
-                                      .arg(arguments.size()));
+                    throw Refusal(QStringLiteral("\"%1\" takes %2; it was given %3 %4")
+                                      .arg(name, action.usage, QString::number(arguments.size()),
+                                           arguments.size() == 1 ? QStringLiteral("argument")
+                                                                 : QStringLiteral("arguments")));
                 }
                 return action.perform(arguments);
             }

@@ -100,7 +100,7 @@ int main(int argc, char *argv[])
         ->type_name("PROFILE");
     app.add_option("--real", realNames, "daemons of the distribution to run in place of simulated services")
         ->type_name("NAME,...");
-    app.set_version_flag("--version", CORVANEMDM_VERSION);
+    app.set_version_flag("--version", "corvane-simulator " CORVANEMDM_VERSION);
 
     RunSettings settings;
     try {

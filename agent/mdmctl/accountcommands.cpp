@@ -8,10 +8,9 @@
 #include "suggestion.h"
 #include "table.h"
 
-#include <inputfile.h>
+#include <jsondocument.h>
 
 #include <QtCore/QJsonArray>
-#include <QtCore/QJsonDocument>
 #include <QtCore/QJsonObject>
 
 namespace Corvane
@@ -169,16 +168,13 @@ int runCreate(const Values &values)
         {QStringLiteral("readOnly"), values.has(readOnlyName)},
     };
     if (values.has(configurationName)) {
-        constexpr qint64 largest = 1024 * 1024;
-        const InputFile file = readInputFile(values.first(configurationName), largest);
-        QJsonParseError error;
-        const QJsonDocument document = QJsonDocument::fromJson(file.content, &error);
-        if (!file.error.isEmpty() || !document.isObject()) {
-            printError(QStringLiteral("%1: %2").arg(
-                file.name, file.error.isEmpty() ? QStringLiteral("must hold a JSON object") : file.error));
+        // What a provider takes is known to the phone alone.
+        const JsonDocument document = readJsonDocument(values.first(configurationName), "{}");
+        if (!document.isValid()) {
+            printError(document.error);
             return ExitUsage;
         }
-        description.insert(QStringLiteral("configuration"), document.object());
+        description.insert(QStringLiteral("configuration"), document.object);
     }
     const SecretInput::Result password = passwordInput().read(values);
     if (password.status != ExitDone)

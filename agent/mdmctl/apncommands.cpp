@@ -68,21 +68,22 @@ void addRow(Table *table, const QString &imsi, const AccessPoint &accessPoint)
 
 int runList(MobileNetworks &networks, const Values &values)
 {
+    const QString imsi = values.first(imsiName());
     const Answer<QStringList> imsis
-        = values.has(imsiName()) ? Answer<QStringList>{{}, {values.first(imsiName())}} : networks.imsis();
+        = imsi.isEmpty() ? networks.imsis() : Answer<QStringList>{networks.ensureSim(imsi), {imsi}};
     if (!imsis.reply.isDone())
         return conclude(imsis.reply);
     const Answer<QMap<QString, AccessPoints>> found = networks.accessPoints(imsis.value);
-    if (!found.reply.isDone() && found.value.isEmpty())
-        return conclude(found.reply);
     Table table = accessPointsTable();
     QJsonArray json;
-    for (const QString &imsi : imsis.value) {
-        for (const AccessPoint &accessPoint : found.value.value(imsi)) {
-            addRow(&table, imsi, accessPoint);
-            json.append(toJson(imsi, accessPoint));
+    for (const QString &each : imsis.value) {
+        for (const AccessPoint &accessPoint : found.value.value(each)) {
+            addRow(&table, each, accessPoint);
+            json.append(toJson(each, accessPoint));
         }
     }
+    if (!found.reply.isDone() && json.isEmpty())
+        return conclude(found.reply);
     printResult(values, json.isEmpty() ? QStringLiteral("There are no access points.") : table.toString(),
                 {{QStringLiteral("accessPoints"), json}});
     return conclude(found.reply);

@@ -50,6 +50,16 @@ bool isOption(const QString &word)
     return word.startsWith(QLatin1Char('-'));
 }
 
+bool knowsOption(const Command &command, const QString &name)
+{
+    const auto isNamed = [&name](const Option &option) {
+        return option.name == name;
+    };
+    return std::any_of(command.options.cbegin(), command.options.cend(), isNamed)
+        || std::any_of(command.commands.cbegin(), command.commands.cend(),
+                       [&name](const Command &further) { return knowsOption(further, name); });
+}
+
 // CLI11 tells of a wrong command only that it did not expect it, so commands are looked up here.
 Found find(const Command &program, const QStringList &words)
 {
@@ -58,6 +68,12 @@ Found find(const Command &program, const QStringList &words)
     auto word = words.cbegin();
     for (; word != words.cend() && !found.path.last()->commands.isEmpty(); ++word) {
         if (isOption(*word)) {
+            // What follows may be its value, so that the walk cannot go on.
+            const QString name = word->section(QLatin1Char('='), 0, 0);
+            if (name != jsonName && knowsOption(program, name)) {
+                found.error = QStringLiteral("option \"%1\" goes behind the command it is for").arg(name);
+                return found;
+            }
             early.append(*word);
             continue;
         }

@@ -63,10 +63,8 @@ Report reportOf(const LocationInfo &info)
 void request(Wait *wait, const std::function<void()> &request)
 {
     const Reply reply = ask(Service::mdmProxy(), failures, request);
-    if (!reply.isDone()) {
-        wait->end(reply.outcome,
-                  reply.outcome == Reply::Refused ? Service::mdmProxy().refusal(reply.text) : reply.text);
-    }
+    if (!reply.isDone())
+        wait->end(reply.outcome, reply.text);
 }
 
 int runOnce(LocationInfo &info, const Values &values)
@@ -122,7 +120,10 @@ Command locationCommand()
     Command once = command(QStringLiteral("once"), QStringLiteral("Find out where the phone is"), runOnce);
     once.options.append(
         timeoutOption(QStringLiteral("Give up after so many seconds without a position (default: 300)")));
-    once.description = QStringLiteral("JSON: an object with %1.").arg(members);
+    once.description = QStringLiteral("No position comes while location is switched off: \"mdmctl location "
+                                      "settings\" shows\nwhether it is.\n\n"
+                                      "JSON: an object with %1.")
+                           .arg(members);
 
     Command watch = command(QStringLiteral("watch"), QStringLiteral("Follow where the phone is"), runWatch);
     watch.description

@@ -101,14 +101,11 @@ QJsonObject toJson(const NotificationData &notification)
 /** Asks the phone; the library names failures in the same way. */
 Reply askPhone(const std::function<void()> &question)
 {
-    Reply reply = ask(Service::mdmProxy(),
-                      QStringLiteral("^Failed to (?:create notification|update notification|retrieve "
-                                     "notifications|retrieve notifications by category): "
-                                     "|^Failed to close notification: \"(.*)\"$"),
-                      question);
-    if (reply.outcome == Reply::Refused)
-        reply.text = Service::mdmProxy().refusal(reply.text);
-    return reply;
+    return ask(Service::mdmProxy(),
+               QStringLiteral("^Failed to (?:create notification|update notification|retrieve "
+                              "notifications|retrieve notifications by category): "
+                              "|^Failed to close notification: \"(.*)\"$"),
+               question);
 }
 
 Answer<QList<NotificationData>> notifications(const NotificationInfo &info, const Values &values)

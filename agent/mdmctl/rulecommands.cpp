@@ -25,6 +25,10 @@ const QLatin1String directionArgument("DIR");
 const QLatin1String actionArgument("ACTION");
 const QLatin1String ruleArgument("IMSI=ACTION");
 
+// Of the examples.
+const QString noRules = QStringLiteral("[]");
+const QString someRules = QStringLiteral(R"([{"imsi": "244051234567890", "action": "block"}])");
+
 Traffic trafficOf(const RuleFamily &family, const Values &values)
 {
     return family.trafficNamed(values.first(directionArgument));
@@ -275,7 +279,7 @@ private:
     Command change(const QString &name, const QString &summary, const QVector<Argument> &arguments,
                    Run run) const;
     /** The lines of help that show @p commands, each given from its name on, with "DIR" for a direction. */
-    QString examples(const QStringList &commands) const;
+    QString examples(const QStringList &commands, const QString &rules = someRules) const;
     QString oneOf(const QString &several) const;
 
     Command show() const;
@@ -352,7 +356,7 @@ Command FamilyCommands::change(const QString &name, const QString &summary,
     return change;
 }
 
-QString FamilyCommands::examples(const QStringList &commands) const
+QString FamilyCommands::examples(const QStringList &commands, const QString &rules) const
 {
     QStringList lines{commands.size() == 1 ? QStringLiteral("Example:") : QStringLiteral("Examples:")};
     for (QString command : commands) {
@@ -361,9 +365,9 @@ QString FamilyCommands::examples(const QStringList &commands) const
         lines.append(QStringLiteral("  mdmctl %1 %2").arg(m_family.name, command.trimmed()));
     }
     return lines.join(QLatin1Char('\n'))
-        + QStringLiteral("\n\nJSON, after the change: {\"changed\": true, %1\"default\": \"allow\",\n"
-                         "\"rules\": [{\"imsi\": \"244051234567890\", \"action\": \"block\"}]}")
-              .arg(m_family.hasDirections() ? QStringLiteral("\"direction\": \"dial\", ") : QString());
+        + QStringLiteral(
+              "\n\nJSON, after the change: {\"changed\": true, %1\"default\": \"allow\",\n\"rules\": %2}")
+              .arg(m_family.hasDirections() ? QStringLiteral("\"direction\": \"dial\", ") : QString(), rules);
 }
 
 QString FamilyCommands::oneOf(const QString &several) const
@@ -407,7 +411,7 @@ Command FamilyCommands::remove() const
     Command remove
         = change(QStringLiteral("remove"), QStringLiteral("Remove the rule of a SIM"), {m_imsi}, runRemove);
     remove.description = QStringLiteral("A rule that is not there cannot be removed: exit status 1.\n\n")
-        + examples({QStringLiteral("remove DIR 244051234567890")});
+        + examples({QStringLiteral("remove DIR 244051234567890")}, noRules);
     return remove;
 }
 
@@ -422,7 +426,7 @@ Command FamilyCommands::set() const
 Command FamilyCommands::clear() const
 {
     Command clear = change(QStringLiteral("clear"), oneOf(QStringLiteral("Remove all rules")), {}, runClear);
-    clear.description = examples({QStringLiteral("clear DIR ")});
+    clear.description = examples({QStringLiteral("clear DIR ")}, noRules);
     return clear;
 }
 

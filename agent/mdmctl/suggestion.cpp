@@ -2,6 +2,7 @@
 #include "suggestion.h"
 
 #include <algorithm>
+#include <iterator>
 #include <numeric>
 #include <vector>
 
@@ -36,16 +37,30 @@ int distance(const QString &a, const QString &b)
     return previous.back();
 }
 
-// The choice that a slip or a cut-off word stands for; empty when none is near.
+QString digitsOf(const QString &word)
+{
+    QString digits;
+    std::copy_if(word.cbegin(), word.cend(), std::back_inserter(digits),
+                 [](QChar letter) { return letter.isDigit(); });
+    return digits;
+}
+
+// The choice that a slip or a cut-off word stands for; empty when none is near. Who writes another digit has
+// not slipped, and a slip leaves too little of a short word.
 QString nearest(const QString &given, const QStringList &choices)
 {
+    constexpr int shortest = 3;
+    if (choices.contains(given))
+        return given;
     QString found;
     int tolerated = std::min(std::max(1, given.size() / 3), given.size() - 1);
     for (const QString &choice : choices) {
+        if (choice.size() < shortest)
+            continue;
         if (!given.isEmpty() && choice.startsWith(given))
             return choice;
         const int slips = distance(given, choice);
-        if (slips <= tolerated) {
+        if (slips <= tolerated && digitsOf(choice) == digitsOf(given)) {
             found = choice;
             tolerated = slips - 1;
         }

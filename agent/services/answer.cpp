@@ -12,9 +12,9 @@ Reply ask(const Service &service, const QString &failures, const std::function<v
 {
     Reply reply;
     {
-        const WarningCapture capture(failures, [&reply](const QString &reason) {
+        const WarningCapture capture(failures, [&](const QString &reason) {
             if (reply.isDone())
-                reply = {Reply::Refused, reason};
+                reply = {Reply::Refused, service.refusal(reason)};
         });
         question();
     }

@@ -20,7 +20,7 @@ template <typename T> struct Answer {
 
 /**
  * Has @p question asked, whose failure the library tells by a warning that matches @p failures, and by
- * nothing else. A refused reply has the reason that the warning gives.
+ * nothing else. A refused reply names the service, and has the reason that the warning gives.
  */
 Reply ask(const Service &service, const QString &failures, const std::function<void()> &question);
 

@@ -22,7 +22,7 @@ namespace
  * captures. */
 struct Failure {
     QString pattern;
-    QString text; ///< empty: nothing that anybody has to know
+    QString text; ///< empty: nothing that anybody has to know; "%1" alone: why the service refused
     Service service; ///< that failed
 };
 
@@ -36,7 +36,11 @@ const QVector<Failure> &failures()
                         "properties|get modems|get radio settings properties|set the preferred radio "
                         "technology|get contexts|set the default data SIM|get access point settings): "
                         "\"(.*)\"$"),
-         telephony.refusal(refused), telephony},
+         refused, telephony},
+        // The way to the access points of one SIM is an interface that a stock service lacks.
+        {QStringLiteral(
+             R"re(^Unable to set the default data SIM: "(?:No such interface |Method .* doesn't exist))re"),
+         SimCards::untold().text, telephony},
         {QStringLiteral("^Unable to set (.*) for the given IMSI: "),
          telephony.toString() + QLatin1String(" did not take the %1"), telephony},
         {QStringLiteral("^(?:No such modem path|Unsupported cellular technologies selection)"),
@@ -47,7 +51,7 @@ const QVector<Failure> &failures()
          QStringLiteral("SIM %1 has no access point for the internet"), telephony},
         {QStringLiteral("^Unable to find \\d+ connection context for IMSI: \"(.*)\"$"),
          QStringLiteral("SIM %1 has no access point of this type"), telephony},
-        {QStringLiteral("^Unable to (?:connect|disconnect): \"(.*)\"$"), manager.refusal(refused), manager},
+        {QStringLiteral("^Unable to (?:connect|disconnect): \"(.*)\"$"), refused, manager},
         {QStringLiteral("^Unable to set auto connect: \"(.*)\"$"),
          manager.toString() + QLatin1String(" does not change what comes up by itself: %1"), manager},
         {QStringLiteral("^Unable to read network services"),
@@ -59,9 +63,16 @@ const QVector<Failure> &failures()
         {QStringLiteral("^Connection State property not returned for connection: .* from IMSI: \"(.*)\"$"),
          manager.toString() + QLatin1String(" does not tell whether mobile data is up through SIM %1"),
          manager},
-        {QStringLiteral("^\"(.*)\"$"), manager.refusal(refused), manager},
+        {QStringLiteral("^\"(.*)\"$"), refused, manager},
     };
     return all;
+}
+
+QString textOf(const Failure &failure, const QString &captured)
+{
+    if (failure.text == QLatin1String("%1"))
+        return failure.service.refusal(captured);
+    return failure.text.contains(QLatin1String("%1")) ? failure.text.arg(captured) : failure.text;
 }
 
 /** Has @p question asked; what fails of it is in the reply, in the order of the failures. */
@@ -72,8 +83,7 @@ Reply ask(const std::function<void()> &question)
     std::vector<std::unique_ptr<WarningCapture>> captures;
     for (const Failure &failure : failures()) {
         captures.push_back(std::make_unique<WarningCapture>(failure.pattern, [&](const QString &captured) {
-            const QString text
-                = failure.text.contains(QLatin1String("%1")) ? failure.text.arg(captured) : failure.text;
+            const QString text = textOf(failure, captured);
             if (!text.isEmpty() && !texts.contains(text))
                 texts.append(text);
             // A service that died under the question explains the failure better than the bus does.

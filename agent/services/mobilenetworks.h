@@ -49,6 +49,9 @@ public:
     Answer<Technologies> selected(const QString &modemPath) const;
     Reply select(const QString &modemPath, Technologies technologies);
 
+    /** Refused unless the SIM is in the phone. */
+    Reply ensureSim(const QString &imsi) const;
+
     /** The SIMs that mobile data can go through. */
     Answer<QStringList> imsis() const;
     Answer<bool> isConnected(const QString &imsi) const;
@@ -61,7 +64,6 @@ public:
     Reply setAccessPoint(const QString &imsi, const AccessPoint &accessPoint);
 
 private:
-    Reply ensureSim(const QString &imsi) const;
     QString dataSim() const;
 
     std::chrono::milliseconds m_timeout;

@@ -2,6 +2,7 @@
 #include "securityswitches.h"
 
 #include "wait.h"
+#include "warningcapture.h"
 
 namespace Corvane
 {
@@ -54,24 +55,21 @@ Answer<bool> SecuritySwitches::sideloading() const
 {
     Answer<bool> answer;
     // The daemon's file is read without the daemon.
-    answer.reply = ask(Service::bus(), QStringLiteral("^Unable to fetch sideloading key"),
-                       [&] { answer.value = m_settings.sideloadingAllowed(); });
-    if (!answer.reply.isDone())
-        answer.reply = {Reply::Refused,
-                        QStringLiteral("the phone does not say whether packages from outside the "
-                                       "store are allowed: ")
-                            + answer.reply.text};
+    const WarningCapture capture(QStringLiteral("^Unable to fetch sideloading key"),
+                                 [&answer](const QString &reason) {
+                                     answer.reply = {Reply::Refused,
+                                                     QStringLiteral("the phone does not say whether packages "
+                                                                    "from outside the store are allowed: ")
+                                                         + reason};
+                                 });
+    answer.value = m_settings.sideloadingAllowed();
     return answer;
 }
 
 Reply SecuritySwitches::setSideloading(bool allowed)
 {
-    const Service daemon = Service::deviceLock();
-    Reply reply = ask(daemon, QStringLiteral("^Failed to change sideloading state"),
-                      [&] { m_settings.setSideloadingAllowed(allowed); });
-    if (reply.outcome == Reply::Refused)
-        reply.text = daemon.refusal(reply.text);
-    return reply;
+    return ask(Service::deviceLock(), QStringLiteral("^Failed to change sideloading state"),
+               [&] { m_settings.setSideloadingAllowed(allowed); });
 }
 
 } // namespace Agent

@@ -3,6 +3,7 @@
 
 #include "systembus.h"
 
+#include <QtCore/QRegularExpression>
 #include <QtDBus/QDBusConnection>
 #include <QtDBus/QDBusConnectionInterface>
 #include <QtDBus/QDBusReply>
@@ -11,6 +12,23 @@ namespace Corvane
 {
 namespace Agent
 {
+
+namespace
+{
+
+/** Whether QtDBus or the bus gives @p reason in the place of a service that says nothing. */
+bool isSilence(const QString &reason)
+{
+    static const QRegularExpression name(
+        QStringLiteral(R"re(\borg\.freedesktop\.DBus\.Error\.(?:NoReply|Timeout|TimedOut)\)?$)re"));
+    // Not every failure has its name with it.
+    static const QLatin1String text("Did not receive a reply.");
+    // The name is the same when the service died before it could answer.
+    static const QLatin1String death("Message recipient disconnected");
+    return reason.startsWith(text) || (name.match(reason).hasMatch() && !reason.startsWith(death));
+}
+
+} // namespace
 
 Service Service::telephony()
 {
@@ -92,6 +110,8 @@ Reply Service::notRunning() const
 
 QString Service::refusal(const QString &reason) const
 {
+    if (isSilence(reason))
+        return toString() + QLatin1String(" did not answer within 25 s");
     return QStringLiteral("%1 refused: %2").arg(toString(), reason);
 }
 

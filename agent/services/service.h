@@ -42,7 +42,7 @@ struct Service {
     /** The answer to everything that is asked of a service that is not there. */
     Reply notRunning() const;
 
-    /** "the telephony service (org.ofono) refused: @p reason" */
+    /** "the telephony service (org.ofono) refused: @p reason", or that it did not answer at all */
     QString refusal(const QString &reason) const;
 };
 

@@ -35,6 +35,11 @@ Reply SimCards::ask() const
         return {};
     if (!Service::telephony().isRunning())
         return Service::telephony().notRunning();
+    return untold();
+}
+
+Reply SimCards::untold()
+{
     return {Reply::Refused, Service::telephony().toString() + QLatin1String(" does not tell its SIM slots")};
 }
 

@@ -29,6 +29,9 @@ public:
     /** Whether the telephony service tells its slots; a stock one does not. */
     Reply ask() const;
 
+    /** The answer of a telephony service that does not. */
+    static Reply untold();
+
     /** Waits until the states of all slots are known. */
     Reply open();
 

@@ -28,6 +28,13 @@ QByteArray &messagePrefix()
     return prefix;
 }
 
+/** @p text as it was before QDebug put it between quotation marks. */
+QString unescaped(QString text)
+{
+    static const QRegularExpression escape(QStringLiteral(R"re(\\(["\\]))re"));
+    return text.replace(escape, QStringLiteral("\\1"));
+}
+
 bool onMainThread()
 {
     return !qApp || qApp->thread() == QThread::currentThread();
@@ -61,7 +68,7 @@ QString WarningCapture::reasonOf(const QString &warning)
     if (!match.hasMatch())
         return warning;
     const QString name = match.captured(1);
-    const QString message = match.captured(2);
+    const QString message = unescaped(match.captured(2));
     return message.isEmpty() ? name : QStringLiteral("%1 (%2)").arg(message, name);
 }
 
@@ -85,7 +92,7 @@ bool WarningCapture::take(const QString &message) const
     const QRegularExpressionMatch match = m_pattern.match(message);
     if (!match.hasMatch())
         return false;
-    m_taker(match.lastCapturedIndex() > 0 ? match.captured(1) : reasonOf(message));
+    m_taker(match.lastCapturedIndex() > 0 ? unescaped(match.captured(1)) : reasonOf(message));
     return true;
 }
 

@@ -537,7 +537,7 @@ CommandLine::CommandLine()
 {
     m_app.footer(examples);
     m_app.require_subcommand(1);
-    m_app.set_version_flag("--version", CORVANEMDM_VERSION);
+    m_app.set_version_flag("--version", "corvane-simctl " CORVANEMDM_VERSION);
     addServiceCommands();
     addFaultCommands();
     addSignalCommand();

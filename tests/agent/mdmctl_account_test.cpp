@@ -42,7 +42,10 @@ private Q_SLOTS:
     void passwordComesFromAnywhereButArguments();
     void mistakesSendNothing_data();
     void mistakesSendNothing();
+    void brokenConfigurationIsTold_data();
+    void brokenConfigurationIsTold();
     void refusalsAreTold();
+    void silenceIsTold();
     void deletesSeveral();
     void absenceIsTold();
     void secretsStaySecret();
@@ -235,7 +238,9 @@ void MdmctlAccountTest::mistakesSendNothing_data()
     row("create-email a@b --password-file x --password-env Y",
         "--password-file and --password-env exclude each other");
     row("create p s", "USER is missing; usage: mdmctl account create PROVIDER SERVICE USER");
-    row("create p s u --configuration /dev/null", "/dev/null: must hold a JSON object");
+    row("create p s u --configuration /dev/null", "/dev/null: is empty, must be a JSON object");
+    row("create p s u --configuration /nowhere.json",
+        "/nowhere.json: cannot be read: No such file or directory");
     row("delete", "ID is missing; usage: mdmctl account delete ID...");
     row("delete 1 x", R"(ID "x": must be the number of an account, as in "mdmctl account list")");
     row("delete 0", R"(ID "0": must be the number of an account, as in "mdmctl account list")");
@@ -251,6 +256,27 @@ void MdmctlAccountTest::mistakesSendNothing()
     QCOMPARE(m_phone.takeJournal(Service), QStringList());
 }
 
+void MdmctlAccountTest::brokenConfigurationIsTold_data()
+{
+    QTest::addColumn<QByteArray>("content");
+    QTest::addColumn<QString>("message");
+
+    QTest::newRow("syntax") << QByteArray("{\n  \"host\": h\n}") << ":2:10: illegal number";
+    QTest::newRow("array") << QByteArray("[]") << ": must be a JSON object, is an array";
+}
+
+void MdmctlAccountTest::brokenConfigurationIsTold()
+{
+    QFETCH(QByteArray, content);
+    QFETCH(QString, message);
+    const QString configuration = file("configuration", content);
+    const Mdmctl::Result refused = run(
+        QStringLiteral("create p s u --configuration %1 --password-file %2").arg(configuration, m_password));
+    QCOMPARE(refused.errors, QStringLiteral("mdmctl: %1%2\n").arg(configuration, message));
+    QCOMPARE(refused.status, 2);
+    QCOMPARE(m_phone.takeJournal(Service), QStringList());
+}
+
 void MdmctlAccountTest::refusalsAreTold()
 {
     const Mdmctl::Result unknown = run(QStringLiteral("create none none lena --password-file ") + m_password);
@@ -261,6 +287,17 @@ void MdmctlAccountTest::refusalsAreTold()
     const Mdmctl::Result denied = run(QStringLiteral("list"));
     QCOMPARE(denied.errors, Refused + QStringLiteral("not you\n"));
     QCOMPARE(denied.status, 1);
+}
+
+void MdmctlAccountTest::silenceIsTold()
+{
+    m_phone.failCalls(Service, Path, QString(), QStringLiteral("org.freedesktop.DBus.Error.NoReply"),
+                      QStringLiteral("Did not receive a reply. Possible causes include: the remote "
+                                     "application did not send a reply"));
+    const Mdmctl::Result silent = run(QStringLiteral("list"));
+    QCOMPARE(silent.errors,
+             QStringLiteral("mdmctl: the MDM proxy (org.corvaneos.mdmproxy) did not answer within 25 s\n"));
+    QCOMPARE(silent.status, 1);
 }
 
 void MdmctlAccountTest::deletesSeveral()
@@ -395,9 +432,9 @@ void MdmctlAccountTest::policyDriftIsPutRight()
                   QStringLiteral("0.2")});
     QVERIFY(watch.waitForOutput(QStringLiteral("Watching for drift")));
     // Nobody announces this.
-    QCOMPARE(
-        run(QStringLiteral("create corvane-cloud corvane-cloud-sync lena --password-file ") + m_password).status,
-        0);
+    QCOMPARE(run(QStringLiteral("create corvane-cloud corvane-cloud-sync lena --password-file ") + m_password)
+                 .status,
+             0);
     QVERIFY(watch.waitForOutput(QStringLiteral("accounts.corvane-cloud.lena: changed (remove it)")));
     watch.interrupt(SIGINT);
     QCOMPARE(watch.finish().status, 0);

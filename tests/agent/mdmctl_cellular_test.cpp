@@ -61,6 +61,7 @@ private Q_SLOTS:
     void connectionAsJson();
     void flightModeIsExplained();
     void listsAccessPoints();
+    void telephonyWithoutSlotsIsTold();
     void listsNoPassword();
     void leavesTheSimForDataAlone();
     void setsWhatIsNamed();
@@ -117,6 +118,7 @@ void MdmctlCellularTest::cleanup()
     m_phone.clearFaults();
     m_phone.startService(Ofono);
     m_phone.startService(ConnMan);
+    act("phone extensions", {QStringLiteral("on")});
     act("flight-mode", {QStringLiteral("off")});
     run("cellular disconnect 244051234567890");
     run("cellular select /ril_0 any");
@@ -183,18 +185,21 @@ void MdmctlCellularTest::mistakes_data()
         QTest::newRow(arguments) << QString::fromUtf8(message) << status;
     };
     row("cellular select /ril_0 4G", R"(TECHNOLOGY "4G": did you mean "4g"?)", 2);
+    row("cellular select /ril_0 5g", R"(TECHNOLOGY "5g": must be one of "any", "2g", "3g", "4g")", 2);
     row("cellular select /ril_7 4g",
         R"(no modem or SIM /ril_7 in the phone; "mdmctl cellular technologies" lists them)", 1);
     row("cellular connect me", R"(IMSI "me": must be 1 to 15 decimal digits)", 2);
     row("cellular connect 99", "no SIM 99 in the phone", 1);
     row("cellular disconnect 99", "no SIM 99 in the phone", 1);
+    row("apn list 99", "no SIM 99 in the phone", 1);
     row("apn set 99 internet --apn x", "no SIM 99 with an access point of type internet in the phone", 1);
     row("apn set 244051234567890 ims --apn x",
         "no SIM 244051234567890 with an access point of type ims in the phone", 1);
     row("apn set 244051234567890 web --apn x", R"(TYPE "web": must be one of "internet", "mms", "ims")", 2);
     row("apn set 244051234567890 internet", R"(nothing to set; "mdmctl apn set --help" lists the options)",
         2);
-    row("apn set 244051234567890 internet --protocol ipv7", R"(--protocol "ipv7": did you mean "ipv6"?)", 2);
+    row("apn set 244051234567890 internet --protocol ipv7",
+        R"(--protocol "ipv7": must be one of "ip", "ipv6", "dual")", 2);
     row("apn set 244051234567890 internet --password geheim",
         R"(unknown option "--password": did you mean "--password-file"?)", 2);
     row("apn set 244051234567890 internet --password-env A --password-file b",
@@ -253,6 +258,7 @@ void MdmctlCellularTest::refusals()
     m_phone.failCalls(service, path, member, QStringLiteral("com.example.Denied"), QStringLiteral("not you"));
     const Mdmctl::Result refused = run(QTest::currentDataTag());
     QCOMPARE(refused.errors, QStringLiteral("mdmctl: %1\n").arg(message));
+    QVERIFY(!refused.output.contains(QStringLiteral("no access points")));
     QCOMPARE(refused.status, 1);
 }
 
@@ -310,7 +316,19 @@ void MdmctlCellularTest::listsAccessPoints()
              json(R"({"accessPoints": [{"imsi": "262021234567891", "type": "internet", "name": "Tarn Web",
                       "apn": "web.tarn", "username": "", "passwordSet": false, "protocol": "ip",
                       "authentication": "none", "messageCenter": "", "messageProxy": ""}]})"));
-    QCOMPARE(run("apn list 99").output, QStringLiteral("There are no access points.\n"));
+}
+
+void MdmctlCellularTest::telephonyWithoutSlotsIsTold()
+{
+    act("phone extensions", {QStringLiteral("off")});
+    for (const char *command : {"apn list", "apn list --json", "apn list 244051234567890",
+                                "apn set 244051234567890 internet --apn x"}) {
+        const Mdmctl::Result told = run(command);
+        QCOMPARE(told.errors,
+                 QStringLiteral("mdmctl: the telephony service (org.ofono) does not tell its SIM slots\n"));
+        QCOMPARE(told.output, QString());
+        QCOMPARE(told.status, 1);
+    }
 }
 
 void MdmctlCellularTest::listsNoPassword()

@@ -18,6 +18,7 @@ namespace
 const QString Service = QStringLiteral("org.corvaneos.mdmproxy");
 const QString Path = QStringLiteral("/Corvane/Mdm/Proxy/SoftwareUpdate");
 const QString Interface = QStringLiteral("org.corvaneos.mdmproxy.softwareupdate");
+const QString Refused = QStringLiteral("mdmctl: the MDM proxy (org.corvaneos.mdmproxy) refused: ");
 
 QStringList words(const QString &text)
 {
@@ -59,6 +60,9 @@ private Q_SLOTS:
     void newerUpdateHidesTheEndOfTheInstallation();
     void installOfNothingFails();
     void queryThatFailsIsTold();
+    void queryWithAWrongAnswerIsTold();
+    void queryWithoutAnAnswerIsTold_data();
+    void queryWithoutAnAnswerIsTold();
     void absentProxyIsToldAtOnce();
     void proxyThatDiesDuringTheDownload();
     void silenceEndsTheWait();
@@ -338,7 +342,44 @@ void MdmctlUpdateTest::queryThatFailsIsTold()
     m_phone.failCalls(Service, Path, QStringLiteral("latestAvailableUpdateVersion"),
                       QStringLiteral("org.corvaneos.Error.Broken"), QStringLiteral("out of order"));
     const Mdmctl::Result failed = run(QStringLiteral("update status --json"));
-    QCOMPARE(failed.errors, QStringLiteral("mdmctl: out of order (org.corvaneos.Error.Broken)\n"));
+    QCOMPARE(failed.errors, Refused + QStringLiteral("out of order (org.corvaneos.Error.Broken)\n"));
+    QCOMPARE(failed.output, QString());
+    QCOMPARE(failed.status, 1);
+}
+
+void MdmctlUpdateTest::queryWithAWrongAnswerIsTold()
+{
+    m_phone.answerCalls(Service, Path, QStringLiteral("latestAvailableUpdateVersion"), {7});
+    const Mdmctl::Result failed = run(QStringLiteral("update check"));
+    QVERIFY2(failed.errors.startsWith(Refused), qPrintable(failed.errors));
+    QVERIFY2(failed.errors.contains(QStringLiteral("got \"i\"")), qPrintable(failed.errors));
+    QCOMPARE(failed.status, 1);
+}
+
+void MdmctlUpdateTest::queryWithoutAnAnswerIsTold_data()
+{
+    QTest::addColumn<QString>("name");
+    QTest::addColumn<QString>("text");
+    QTest::addColumn<QString>("message");
+
+    const QString errors = QStringLiteral("org.freedesktop.DBus.Error.");
+    const QString silence
+        = QStringLiteral("mdmctl: the MDM proxy (org.corvaneos.mdmproxy) did not answer within 25 s\n");
+    for (const char *name : {"NoReply", "Timeout", "TimedOut"})
+        QTest::newRow(name) << errors + QLatin1String(name) << QStringLiteral("no answer") << silence;
+    // Of a service that died and is there again the bus tells the same name.
+    const QString death = QStringLiteral("Message recipient disconnected from message bus without replying");
+    QTest::newRow("died") << errors + QLatin1String("NoReply") << death
+                          << QStringLiteral("%1%2 (%3NoReply)\n").arg(Refused, death, errors);
+}
+
+void MdmctlUpdateTest::queryWithoutAnAnswerIsTold()
+{
+    QFETCH(QString, name);
+    QFETCH(QString, text);
+    m_phone.failCalls(Service, Path, QStringLiteral("softwareUpdateIsAvailable"), name, text);
+    const Mdmctl::Result failed = run(QStringLiteral("update status"));
+    QTEST(failed.errors, "message");
     QCOMPARE(failed.output, QString());
     QCOMPARE(failed.status, 1);
 }

@@ -72,7 +72,8 @@ void MdmctlUsageTest::helpTeachesAtEachLevel_data()
 
     QTest::newRow("program") << ""
                              << QStringList{QStringLiteral("policy check company-phone.json"),
-                                            QStringLiteral("3  the service"), QStringLiteral("--version")};
+                                            QStringLiteral("3  the service"), QStringLiteral("--version"),
+                                            QStringLiteral("mdmctl --json ")};
     QTest::newRow("group") << "calls"
                            << QStringList{QStringLiteral("Replace all rules of a direction"),
                                           QStringLiteral("calls COMMAND --help")};
@@ -87,6 +88,14 @@ void MdmctlUsageTest::helpTeachesAtEachLevel_data()
                        QStringLiteral("mdmctl data set 244")};
     QTest::newRow("search") << "call-statistics search"
                             << QStringList{QStringLiteral("--from TIME"), QStringLiteral("\"results\"")};
+    for (const char *family : {"calls", "sms", "data"}) {
+        for (const char *command : {"remove", "clear"}) {
+            const QString words = QStringLiteral("%1 %2").arg(QLatin1String(family), QLatin1String(command));
+            QTest::newRow(qPrintable(words)) << words << QStringList{QStringLiteral("\"rules\": []}\n")};
+        }
+    }
+    QTest::newRow("switched off") << "location once"
+                                  << QStringList{QStringLiteral("mdmctl location settings")};
     QTest::newRow("several") << "calls set" << QStringList{QStringLiteral("DIR IMSI=ACTION...")};
 }
 
@@ -132,6 +141,10 @@ void MdmctlUsageTest::mistakesAreToldInOneLine_data()
     row("update upgrade",
         R"(unknown command "upgrade": must be one of "status", "check", "download", "install", "watch")");
     row("--colour", R"(unknown option "--colour": must be one of "--version", "--help")");
+    row("--timeout 3 calls show", R"(option "--timeout" goes behind the command it is for)");
+    row("--timeout=3 calls show", R"(option "--timeout" goes behind the command it is for)");
+    row("calls --timeout 3 show", R"(option "--timeout" goes behind the command it is for)");
+    row("--wait update install", R"(option "--wait" goes behind the command it is for)");
     row("calls show --jsno", R"(unknown option "--jsno": did you mean "--json"?)");
     row("update status --timeout 3", R"(unknown option "--timeout": must be one of "--help", "--json")");
     row("calls add", R"(DIR is missing; usage: mdmctl calls add DIR IMSI ACTION)");

@@ -336,7 +336,9 @@ void ControlTest::endsFaults()
     QCOMPARE(control(QStringLiteral("ClearFault"), {older}), done);
     QCOMPARE(filterCall(), all);
     QCOMPARE(control(QStringLiteral("ClearFault"), {older}),
-             refused + QStringLiteral("There is no fault %1; Faults() lists those that are set").arg(older));
+             refused
+                 + QStringLiteral("There is no fault %1; \"corvane-simctl faults\" lists those that are set")
+                       .arg(older));
 }
 
 void ControlTest::refusesWrongFaults_data()

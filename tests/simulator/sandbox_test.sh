@@ -97,6 +97,7 @@ exit_status_is_passed_on() {
 }
 
 command_line_is_the_commands() {
+    expect_match "version" "$("$simulator" --version)" '^corvane-simulator [0-9]+\.[0-9]+\.[0-9]+$'
     expect "arguments" "$("$simulator" printf '%s,' --help -- --device x)" "--help,--,--device,x,"
     expect "arguments" "$("$simulator" -- printf %s, a)" "a,"
     expect "input" "$(echo text | phone cat)" text

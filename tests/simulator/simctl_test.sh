@@ -36,7 +36,7 @@ says 0 '' faults
 says 0 'fault 2' fault reply org.ofono GetAll --path /mdm/voicecallfilter/dial --arguments "uint32 7" "[('a', 1)]"
 [[ $(get_all) == "(uint32 7, [('a', 1)])" ]] || { echo "FAIL: fault reply"; failures=$((failures + 1)); }
 says 0 '' clear-fault 2
-says 1 'corvane-simctl: There is no fault 2; .*' clear-fault 2
+says 1 'corvane-simctl: There is no fault 2; "corvane-simctl faults" lists those that are set' clear-fault 2
 says 0 'fault 3' fault late org.ofono "" --interface org.ofono.Modem --delay 5
 says 0 '' clear-faults
 says 1 'corvane-simctl: The fault "late" needs the option "delay", in milliseconds' fault late org.ofono GetAll
@@ -93,9 +93,11 @@ says 0 '.*sim pull SLOT .*' actions
 says 0 'allow \(default action\)' act call dial 0 +358501234567
 says 1 'corvane-simctl: there is no action "sim pul"; did you mean "sim pull"\?' act sim pul 0
 says 1 'corvane-simctl: "sim pull" takes SLOT; it was given 0 arguments' act sim pull
+says 1 'corvane-simctl: "package publish" takes .*; it was given 1 argument' act package publish foo
 
 says 2 'corvane-simctl: there is no command "jurnal"; did you mean "journal"\?' jurnal
 says 2 'corvane-simctl: A subcommand is required; .*'
 says 0 '.*Examples:.*' --help
+says 0 'corvane-simctl [0-9]+\.[0-9]+\.[0-9]+' --version
 
 [[ $failures -eq 0 ]]

@@ -15,6 +15,8 @@ class MdmctlPartsTest : public QObject
 private Q_SLOTS:
     void suggestions_data();
     void suggestions();
+    void suggestionsThatWouldMislead_data();
+    void suggestionsThatWouldMislead();
     void tableIsAligned();
     void tableWithCellsOfSeveralLines();
     void tableWithoutEmptyColumns();
@@ -57,6 +59,33 @@ void MdmctlPartsTest::suggestions()
 {
     QFETCH(QString, given);
     QTEST(suggestion(given, {QStringLiteral("block"), QStringLiteral("allow"), QStringLiteral("hangup")}),
+          "expected");
+}
+
+void MdmctlPartsTest::suggestionsThatWouldMislead_data()
+{
+    QTest::addColumn<QString>("given");
+    QTest::addColumn<QString>("expected");
+
+    const QString all = QStringLiteral(R"(must be one of "2g", "ip", "ipv6", "imap4")");
+    QTest::newRow("another digit") << "imap5" << all;
+    QTest::newRow("short, another digit") << "5g" << all;
+    QTest::newRow("short") << "ipx" << all;
+    QTest::newRow("short, cut off") << "2" << all;
+    QTest::newRow("short, capital") << "2G"
+                                    << R"(did you mean "2g"?)";
+    QTest::newRow("digit cut off") << "imap"
+                                   << R"(did you mean "imap4"?)";
+    QTest::newRow("slip beside the digit") << "imp4"
+                                           << R"(did you mean "imap4"?)";
+}
+
+void MdmctlPartsTest::suggestionsThatWouldMislead()
+{
+    QFETCH(QString, given);
+    QTEST(suggestion(
+              given,
+              {QStringLiteral("2g"), QStringLiteral("ip"), QStringLiteral("ipv6"), QStringLiteral("imap4")}),
           "expected");
 }
 
