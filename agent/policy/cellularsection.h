@@ -6,7 +6,6 @@
 #include "policysection.h"
 #include "simcards.h"
 
-
 #include <memory>
 
 namespace Corvane

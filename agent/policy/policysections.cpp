@@ -32,8 +32,8 @@ PolicySections makePolicySections(const Timeouts &timeouts)
     sections.push_back(std::make_unique<AccountSection>());
     sections.push_back(std::make_unique<CertificateSection>(timeouts.confirmation));
     sections.push_back(std::make_unique<AutostartSection>());
-    sections.push_back(std::make_unique<DeviceSettingsSection>(
-        QStringLiteral("location"), makeLocationSettings, timeouts.confirmation));
+    sections.push_back(std::make_unique<DeviceSettingsSection>(QStringLiteral("location"),
+                                                               makeLocationSettings, timeouts.confirmation));
     sections.push_back(std::make_unique<DeviceSettingsSection>(QStringLiteral("time"), makeClockSettings,
                                                                timeouts.confirmation));
     sections.push_back(std::make_unique<DeviceLockSection>(timeouts.confirmation));

@@ -208,13 +208,14 @@ signals_reach_the_command() {
     local name status
     # SIGINT is left to the terminal's test: the shell makes its background jobs ignore it.
     for name in TERM HUP USR1; do
-        hold_phone "$name" "trap 'echo got $name; exit 9' $name; echo >&8; exec 8>&-; read -r _ <&9"
+        # A signal that comes just before "read" would wait for a line; "wait" sees it.
+        hold_phone "$name" "trap 'echo got $name; exit 9' $name; sleep infinity & echo >&8; exec 8>&-; wait"
         read -r _ <"$work/$name.ready"
         kill -"$name" $held
         status=0
         wait $held || status=$?
         expect "status after SIG$name" $status 9
-            expect "output" "$(cat "$work/$name.out")" "got $name"
+        expect "output" "$(cat "$work/$name.out")" "got $name"
     done
     hold_phone dies 'echo >&8; exec 8>&-; read -r _ <&9'
     read -r _ <"$work/dies.ready"
@@ -302,9 +303,9 @@ on_terminal() { # COMMAND; reads "WAIT_FOR<tab>TYPE" lines
 control_c_reaches_the_command_alone() {
     cat >"$work/interrupted.sh" <<'SCRIPT'
 trap 'echo interrupted; corvane-simctl services; exit 5' INT
+sleep infinity &
 echo ready
-read -r line
-read -r line
+wait
 SCRIPT
     on_terminal "$simulator -- bash $work/interrupted.sh" <<<$'ready\t\\003'
     expect "status" "$terminal_status" 5
