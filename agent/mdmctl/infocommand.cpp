@@ -215,8 +215,9 @@ Command infoCommand()
         "\"softwareVersion\": \"...\", \"softwareVersionId\": \"...\", \"sims\": [{\"present\": true, "
         "\"imsi\": "
         "\"...\",\n\"provider\": \"...\", \"numbers\": [], \"imei\": \"...\"}], \"wlanAddress\": \"...\", "
-        "\"bluetoothAddress\": \"...\",\n\"lockState\": \"unlocked\", \"homeEncrypted\": true, \"packages\": "
-        "3, "
+        "\"bluetoothAddress\": \"...\",\n\"lockState\": \"unlocked\", \"homeEncrypted\": true, \"battery\": "
+        "76, "
+        "\"packages\": 3, "
         "\"missingServices\": []}.\nWhat is not known is null.");
     info.options = {jsonOption(),
                     timeoutOption(QStringLiteral("Wait so many seconds for each service (default: 25)"))};
