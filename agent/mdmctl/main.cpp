@@ -8,6 +8,7 @@
 #include "warningcapture.h"
 
 #include <QtCore/QCoreApplication>
+#include <QtCore/QEvent>
 
 using namespace Corvane::Agent;
 
@@ -74,6 +75,8 @@ int main(int argc, char *argv[])
     const QCoreApplication application(argc, argv);
     const Interruption interruption;
     const int status = runCommandLine(program(), QCoreApplication::arguments().mid(1));
+    // As QCoreApplication::exec() does when it ends; here, event loops run only inside the commands.
+    QCoreApplication::sendPostedEvents(nullptr, QEvent::DeferredDelete);
     if (flushOutput())
         return status;
     printError(QStringLiteral("standard output cannot be written"));

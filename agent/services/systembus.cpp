@@ -26,11 +26,9 @@ Reply SystemBus::reach()
         return {Reply::ServiceLost,
                 QStringLiteral("the system bus cannot be reached: %1").arg(bus.lastError().message())};
     // QtDBus holds signals back until events are first delivered, and may then let later ones get ahead of
-    // them. So that is done before there is anything to hear. The object that did it is to be deleted once
-    // no event loop runs, which may otherwise never be again.
+    // them. So that is done before there is anything to hear.
     static const bool isDelivering = [] {
         QCoreApplication::sendPostedEvents(nullptr, QEvent::MetaCall);
-        QCoreApplication::sendPostedEvents(nullptr, QEvent::DeferredDelete);
         return true;
     }();
     Q_UNUSED(isDelivering)
