@@ -97,7 +97,9 @@ bool RealService::launch(QString &problem)
         problem = QString::fromUtf8(error->message);
         return false;
     }
-    m_group = pid_t(std::strtol(g_subprocess_get_identifier(m_process.get()), nullptr, 10));
+    // None when it has ended already.
+    const gchar *number = g_subprocess_get_identifier(m_process.get());
+    m_group = number ? pid_t(std::strtol(number, nullptr, 10)) : 0;
     g_subprocess_wait_async(
         m_process.get(), nullptr,
         [](GObject *process, GAsyncResult *result, gpointer data) {
