@@ -57,6 +57,11 @@ Phone::Phone()
         m_journalPosition = journal.last().number;
 }
 
+Phone::~Phone()
+{
+    letAnswersGo();
+}
+
 void Phone::stopService(const QString &service)
 {
     control(QStringLiteral("StopService"), {service});

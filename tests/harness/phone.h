@@ -16,6 +16,7 @@ class Phone
 {
 public:
     Phone();
+    ~Phone();
 
     void stopService(const QString &service);
     void startService(const QString &service);

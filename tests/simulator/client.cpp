@@ -102,6 +102,7 @@ Client::~Client()
         QDBusConnection::disconnectFromPeer(m_connectionName);
     else if (!m_connectionName.isEmpty())
         QDBusConnection::disconnectFromBus(m_connectionName);
+    letAnswersGo();
 }
 
 QString Client::uniqueName() const
