@@ -42,7 +42,7 @@ private:
     const std::chrono::milliseconds m_timeout;
     std::unique_ptr<DeviceLocker> m_locker;
     std::unique_ptr<SecuritySwitches> m_switches;
-    std::optional<bool> m_sideloadingSeen; ///< or made so, when the policy names it
+    std::optional<bool> m_sideloadingSeen; ///< as last compared or made, when the policy names it
 };
 
 } // namespace Agent

@@ -45,8 +45,7 @@ private:
     QSet<QString> presentPaths() const;
 
     QMap<QString, QJsonValue> m_entries; ///< by path, of the last comparison
-    std::optional<QSet<QString>>
-        m_presentPaths; ///< by the last comparison and what changed since, when known
+    std::optional<QSet<QString>> m_presentPaths; ///< as last compared or made, when it is known
 };
 
 } // namespace Agent

@@ -36,7 +36,7 @@ public:
 private:
     const std::chrono::milliseconds m_timeout;
     std::unique_ptr<SecuritySwitches> m_switches;
-    bool m_developerModeSeen = false; ///< or made so
+    bool m_developerModeSeen = false; ///< as last compared or made
 };
 
 } // namespace Agent
