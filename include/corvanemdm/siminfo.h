@@ -22,9 +22,11 @@ class SimInfoPrivate;
  * @brief Tells what is in each SIM slot of the phone, and announces each change.
  *
  * The states are mirrored: they arrive after construction, with simStateChanged(), and are kept up from then
- * on. Looking up a modem's objects blocks, in the constructor or in the event loop. The queries that return a
- * list of slots ask the service instead: they block until it has answered, for QtDBus's default timeout (25
- * s) at most with each question, and as long once more when it does not even describe the object.
+ * on. Looking up a modem's objects blocks, in the constructor or in the event loop.
+ *
+ * The queries that return a list of slots ask the service instead: they block until it has answered, for
+ * QtDBus's default timeout (25 s) at most with each question, and as long once more when it does not even
+ * describe the object.
  *
  * While the telephony service is away or not ready the last states are kept; available() tells. A service
  * without the extension for several SIMs has no states to tell, and queries find nothing.

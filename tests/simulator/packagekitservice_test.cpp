@@ -415,10 +415,10 @@ void PackageKitServiceTest::clientThatLeavesTooLateCancelsNothing()
 {
     auto leaving = std::make_unique<Client>(Client::Own);
     const QString transaction = create(*leaving);
+    watch(transaction);
     m_client->watch(service, transaction, properties, ids({"PropertiesChanged"}));
     leaving->call(service, transaction, transactionInterface, QStringLiteral("InstallPackages"),
                   {onlyTrusted, ids({"acme-certificates;2026.1-1;noarch;store"})});
-    watch(transaction);
     QStringList told;
     QVERIFY(waitUntil([&] {
         told += m_client->takeSignals(service);
